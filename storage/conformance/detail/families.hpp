@@ -1,0 +1,35 @@
+#pragma once
+
+#include <storage/conformance/Check.hpp>
+
+#include <vector>
+
+namespace foundation::storage::conformance::detail {
+
+std::vector<Check> creationChecks();
+std::vector<Check> existenceChecks();
+std::vector<Check> removalChecks();
+std::vector<Check> attributesChecks();
+std::vector<Check> locationChecks();
+std::vector<Check> nameChecks();
+std::vector<Check> listingChecks();
+std::vector<Check> patternChecks();
+std::vector<Check> openOptionsChecks();
+std::vector<Check> streamChecks();
+std::vector<Check> transactionChecks();
+std::vector<Check> moveFileChecks();
+std::vector<Check> moveFolderChecks();
+std::vector<Check> copyFileChecks();
+std::vector<Check> atomicCopyChecks();
+std::vector<Check> changeEventChecks();
+std::vector<Check> concurrencyChecks();
+std::vector<Check> readOnlyChecks();
+
+/// Each family stands in a file of its own in suites/.
+inline constexpr std::vector<Check> (*families[])() = {
+    creationChecks,   existenceChecks, removalChecks,     attributesChecks,  locationChecks,    nameChecks,
+    listingChecks,    patternChecks,   openOptionsChecks, streamChecks,      transactionChecks, moveFileChecks,
+    moveFolderChecks, copyFileChecks,  atomicCopyChecks,  changeEventChecks, concurrencyChecks, readOnlyChecks,
+};
+
+} // namespace foundation::storage::conformance::detail

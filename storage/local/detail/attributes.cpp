@@ -1,0 +1,44 @@
+#include <storage/local/detail/attributes.hpp>
+
+#include <cstdint>
+#include <unistd.h>
+#include <utility>
+
+namespace foundation::storage::local::detail {
+
+namespace {
+
+namespace posix_time = boost::posix_time;
+
+auto deferredWritability(std::string path)
+{
+    return [path = std::move(path)] { return checkAccess(path, W_OK) == 0; };
+}
+
+} // namespace
+
+posix_time::ptime toPtime(struct statx_timestamp const& time)
+{
+    static posix_time::ptime const epoch(boost::gregorian::date(1970, 1, 1));
+    static posix_time::ptime const earliest(boost::date_time::min_date_time);
+    static posix_time::ptime const latest(boost::date_time::max_date_time);
+    static std::int64_t const earliestSecond = (earliest - epoch).total_seconds();
+    static std::int64_t const latestSecond = (latest - epoch).total_seconds();
+    if (time.tv_sec < earliestSecond)
+        return earliest;
+    if (time.tv_sec > latestSecond)
+        return latest;
+    return epoch + posix_time::seconds(time.tv_sec) + posix_time::microseconds(time.tv_nsec / 1000);
+}
+
+provider::FileAttributes toFileAttributes(Status const& status, std::string path)
+{
+    return provider::FileAttributes(status.stx_size, toPtime(status.stx_mtime), deferredWritability(std::move(path)));
+}
+
+provider::FolderAttributes toFolderAttributes(Status const& status, std::string path)
+{
+    return provider::FolderAttributes(toPtime(status.stx_mtime), deferredWritability(std::move(path)));
+}
+
+} // namespace foundation::storage::local::detail

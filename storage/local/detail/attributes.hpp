@@ -1,0 +1,21 @@
+#pragma once
+
+#include <foundation/export.hpp>
+#include <storage/local/detail/fileSystem.hpp>
+#include <storage/provider/FileAttributes.hpp>
+#include <storage/provider/FolderAttributes.hpp>
+
+#include <boost/date_time/posix_time/posix_time_types.hpp>
+
+#include <string>
+
+namespace foundation::storage::local::detail {
+
+/// A point in time with microseconds, rounded down; one that the result cannot hold becomes the nearest that it can.
+FOUNDATION_API boost::posix_time::ptime toPtime(struct statx_timestamp const& time);
+
+/// `path` is where writability is asked for, when somebody asks.
+provider::FileAttributes toFileAttributes(Status const& status, std::string path);
+provider::FolderAttributes toFolderAttributes(Status const& status, std::string path);
+
+} // namespace foundation::storage::local::detail

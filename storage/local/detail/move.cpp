@@ -1,0 +1,187 @@
+#include <storage/local/detail/move.hpp>
+
+#include <storage/local/detail/errorCode.hpp>
+#include <storage/local/detail/fileSystem.hpp>
+#include <storage/local/detail/nativePath.hpp>
+
+#include <boost/uuid/random_generator.hpp>
+#include <boost/uuid/uuid_io.hpp>
+
+#include <cerrno>
+#include <cstdio>
+#include <unistd.h>
+
+namespace foundation::storage::local::detail {
+
+using provider::ErrorCode;
+using provider::ReplacementPolicy;
+using provider::StorageIRI;
+
+namespace {
+
+/// Both ends of a move, as the client named them and as the system calls do.
+struct Move
+{
+    Move(StorageIRI const& source, StorageIRI const& target)
+        : from(source), to(target), fromPath(nativePath(source)), toPath(nativePath(target))
+    {}
+
+    StorageIRI const& from;
+    StorageIRI const& to;
+    std::string fromPath;
+    std::string toPath;
+};
+
+std::size_t nameStart(std::string const& path)
+{
+    return path.rfind('/') + 1;
+}
+
+std::string parentOf(std::string const& path)
+{
+    return path.substr(0, nameStart(path));
+}
+
+std::string scratchName()
+{
+    return boost::uuids::to_string(boost::uuids::random_generator()()) + ".tmp.bak";
+}
+
+/// The end of a move that is to blame for an error that does not say.
+StorageIRI const& culprit(int error, Move const& move)
+{
+    bool const forbidden = error == EACCES || error == EPERM;
+    Status status;
+    bool const atSource = forbidden ? checkAccess(parentOf(move.fromPath), W_OK | X_OK) != 0
+                                    : meansMissing(getStatus(move.fromPath, Links::Keep, status));
+    return atSource ? move.from : move.to;
+}
+
+void requireMoved(int error, Move const& move)
+{
+    if (error != 0)
+        throwError(error, culprit(error, move));
+}
+
+Status requireSource(Move const& move)
+{
+    Status status;
+    if (int const error = getStatus(move.fromPath, Links::Keep, status))
+        throwError(error, move.from);
+    return status;
+}
+
+/// Whether two paths lead to the same name in the same folder, rather than to two names of one file.
+bool isSameEntry(Move const& move)
+{
+    Status from;
+    Status to;
+    return move.fromPath.substr(nameStart(move.fromPath)) == move.toPath.substr(nameStart(move.toPath)) &&
+           getStatus(parentOf(move.fromPath), Links::Follow, from) == 0 &&
+           getStatus(parentOf(move.toPath), Links::Follow, to) == 0 && isSameFile(from, to);
+}
+
+bool lacksNoReplace(int error)
+{
+    return error == EINVAL || error == ENOSYS;
+}
+
+/// For a file system without `RENAME_NOREPLACE`: a second name is never made over an existing one either.
+int moveFileBySecondName(Move const& move)
+{
+    if (int const error = addName(move.fromPath, move.toPath))
+        return error == EPERM ? EOPNOTSUPP : error;
+    int const error = removeName(move.fromPath);
+    if (error != 0)
+        removeName(move.toPath);
+    return error;
+}
+
+/// For a file system without `RENAME_NOREPLACE`: a folder is renamed over an empty folder only, and this one is ours.
+int moveFolderOntoNewFolder(Move const& move)
+{
+    if (int const error = makeFolder(move.toPath))
+        return error;
+    int const error = renameEntry(move.fromPath, move.toPath, 0);
+    if (error != 0)
+        removeEmptyFolder(move.toPath);
+    return error;
+}
+
+/// From one name of a file to another, which `rename` leaves both as they are. Once it has a name that nobody else
+/// knows, neither name can have come to mean another file when it goes.
+int moveBetweenNames(Move const& move)
+{
+    if (isSameEntry(move))
+        return 0;
+    std::string const scratch = parentOf(move.toPath) + scratchName();
+    if (int const error = renameEntry(move.fromPath, scratch, RENAME_NOREPLACE))
+        return error;
+    int const error = renameEntry(scratch, move.toPath, 0);
+    if (error != 0)
+        renameEntry(scratch, move.fromPath, RENAME_NOREPLACE);
+    else
+        removeName(scratch);
+    return error;
+}
+
+int moveFileWithoutReplacing(Move const& move)
+{
+    int const error = renameEntry(move.fromPath, move.toPath, RENAME_NOREPLACE);
+    return lacksNoReplace(error) ? moveFileBySecondName(move) : error;
+}
+
+int moveFileReplacing(Move const& move, Status const& source)
+{
+    Status target;
+    bool const exists = getStatus(move.toPath, Links::Keep, target) == 0;
+    if (exists && isSameFile(source, target))
+        return moveBetweenNames(move);
+    if (exists && leadsToFolder(move.toPath))
+        return EEXIST;
+    int const error = renameEntry(move.fromPath, move.toPath, 0);
+    return error == EISDIR ? EEXIST : error;
+}
+
+bool isOntoItself(Move const& move, Status const& source)
+{
+    Status target;
+    return getStatus(move.toPath, Links::Follow, target) == 0 && isSameFile(source, target);
+}
+
+} // namespace
+
+bool replaces(ReplacementPolicy policy)
+{
+    return policy == ReplacementPolicy::Overwrite || policy == ReplacementPolicy::Clobber;
+}
+
+void moveFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
+{
+    Move const move(from, to);
+    Status const source = requireSource(move);
+    if (isFolder(source))
+        throwError(ErrorCode::ResourceNotFound, from);
+    requireMoved(replaces(policy) ? moveFileReplacing(move, source) : moveFileWithoutReplacing(move), move);
+}
+
+void moveFolder(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
+{
+    Move const move(from, to);
+    Status const source = requireSource(move);
+    if (!isFolder(source))
+        throwNotAFolder(move.fromPath, from);
+    int error = renameEntry(move.fromPath, move.toPath, RENAME_NOREPLACE);
+    if (lacksNoReplace(error))
+        error = moveFolderOntoNewFolder(move);
+    if (error == EEXIST && replaces(policy) && isOntoItself(move, source))
+        return;
+    requireMoved(error, move);
+}
+
+void throwNotAFolder(std::string const& path, StorageIRI const& iri)
+{
+    throwError(leadsToFolder(path) ? ErrorCode::InvalidLocation : ErrorCode::ResourceNotFound, iri);
+}
+
+} // namespace foundation::storage::local::detail

@@ -1,0 +1,16 @@
+#pragma once
+
+#include <storage/provider/ReplacementPolicy.hpp>
+#include <storage/provider/StorageIRI.hpp>
+
+namespace foundation::storage::local::detail {
+
+bool replaces(provider::ReplacementPolicy policy);
+
+void moveFile(provider::StorageIRI const& from, provider::StorageIRI const& to, provider::ReplacementPolicy policy);
+void moveFolder(provider::StorageIRI const& from, provider::StorageIRI const& to, provider::ReplacementPolicy policy);
+
+/// Throws what is wrong with a location where a folder itself, not a link to one, had to stand.
+[[noreturn]] void throwNotAFolder(std::string const& path, provider::StorageIRI const& iri);
+
+} // namespace foundation::storage::local::detail

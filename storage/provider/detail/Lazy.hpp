@@ -1,0 +1,44 @@
+#pragma once
+
+#include <foundation/export.hpp>
+
+#include <boost/variant.hpp>
+
+#include <atomic>
+#include <functional>
+#include <mutex>
+
+namespace foundation::storage::provider::detail {
+
+template <typename T>
+class Lazy;
+
+/// A flag that is known, or computed by a function on the first call.
+///
+/// Threads: the function runs at most once per object however many threads ask; once the answer is known, a call costs
+/// one pointer test. A function that throws leaves the object as it was, and the next call runs it again. A copy made
+/// before the answer is known computes for itself.
+template <>
+class FOUNDATION_API Lazy<bool>
+{
+public:
+    using Value = boost::variant<bool, std::function<bool()>>;
+
+    explicit Lazy(Value value);
+    Lazy(Lazy const& other);
+    Lazy& operator=(Lazy const&) = delete;
+    ~Lazy() = default;
+
+    /// Throws `std::bad_function_call` for an empty function, and what the function throws.
+    bool operator()();
+
+private:
+    static Value copyValueOf(Lazy const& other);
+    void publishIfKnown();
+
+    Value value_;
+    std::atomic<bool const*> resolved_{nullptr};
+    mutable std::mutex mutex_;
+};
+
+} // namespace foundation::storage::provider::detail

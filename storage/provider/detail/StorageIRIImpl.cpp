@@ -1,0 +1,79 @@
+#include <storage/provider/detail/StorageIRIImpl.hpp>
+
+#include <foundation/core/except/AnonymousInternalException.hpp>
+#include <foundation/network/IRIArgs.hpp>
+#include <foundation/network/wide.hpp>
+#include <foundation/ustring.hpp>
+
+#include <algorithm>
+#include <sstream>
+#include <stdexcept>
+
+namespace foundation::storage::provider::detail {
+
+namespace {
+
+using core::except::detail::AnonymousInternalException;
+
+std::u16string resolvePath(std::u16string base, std::u16string const& path)
+{
+    if (!base.ends_with(u'/'))
+        base += u'/';
+    if (path.find(u'/') == std::u16string::npos && path != u"." && path != u"..")
+        return base + path;
+    network::IRIArgs args;
+    args.hasPath = true;
+    args.path = network::toWide(base);
+    network::IRI const baseIRI(args);
+    args.path = network::toWide(path);
+    network::IRI const reference(args);
+    std::u16string resolved = reference.resolveAgainst(baseIRI).getPath(network::iri::Encoding::Decoded);
+    stripTrailingSlash(resolved);
+    return resolved;
+}
+
+} // namespace
+
+StorageIRIImpl::StorageIRIImpl()
+    : resolvedPath_([this] { return getPath().size() > 1 ? resolvePath(u"/", getPath()) : getPath(); })
+{}
+
+bool StorageIRIImpl::equals(StorageIRIImpl const& other) const
+{
+    if (this == &other)
+        return true;
+    std::u16string const& text = toString();
+    std::u16string const& otherText = other.toString();
+    return std::equal(text.begin(), text.end(), otherText.begin(), otherText.end());
+}
+
+bool StorageIRIImpl::less(StorageIRIImpl const& other) const
+{
+    return this != &other && toString() < other.toString();
+}
+
+void stripTrailingSlash(std::u16string& path)
+{
+    if (path.size() > 1 && path.back() == u'/')
+        path.pop_back();
+}
+
+void throwNotAbsolute(std::u16string const& iriText)
+{
+    std::ostringstream message;
+    message << "IRI '";
+    ustring::insert(message, iriText) << "' is not absolute.";
+    throw AnonymousInternalException<std::runtime_error>(message.str());
+}
+
+void throwNoParent()
+{
+    throw AnonymousInternalException<std::logic_error>("IRI does not have a parent IRI.");
+}
+
+void throwNoInnerIRI()
+{
+    throw AnonymousInternalException<std::logic_error>("IRI does not have an inner IRI.");
+}
+
+} // namespace foundation::storage::provider::detail

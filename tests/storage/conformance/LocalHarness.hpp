@@ -1,0 +1,10 @@
+#pragma once
+
+#include <storage/conformance/Harness.hpp>
+
+namespace foundation::storage::conformance {
+
+/// Tries the provider of this machine's files in a temporary folder.
+Harness localHarness();
+
+} // namespace foundation::storage::conformance

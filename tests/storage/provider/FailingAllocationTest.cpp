@@ -1,0 +1,125 @@
+// What is left when memory runs out, at the first, second, third … allocation of an operation.
+
+#include <storage/provider.hpp>
+
+#include <storage/provider/detail/Lazy.hpp>
+#include <tests/support/MinimalProvider.hpp>
+#include <tests/support/RecordingByteStream.hpp>
+#include <tests/support/allocations.hpp>
+
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <memory>
+#include <string>
+
+namespace foundation::storage::provider {
+namespace {
+
+using namespace tests::support;
+
+StorageIRI const here(u"scheme://host.example/a-folder-with-a-long-name/a-file-with-a-long-name.txt");
+
+template <class Action>
+std::size_t failEachAllocationOf(Action action)
+{
+    return tests::support::failEachAllocationOf(action, [] {});
+}
+
+TEST(FailingAllocation, DestroysTheStreamThatADeviceCannotShare)
+{
+    int destroyed = 0;
+    int made = 0;
+    std::unique_ptr<ByteStream> stream;
+    auto const makeStream = [&] {
+        auto recording = std::make_unique<RecordingByteStream>();
+        recording->onDestruction = [&destroyed] { ++destroyed; };
+        stream = std::move(recording);
+        ++made;
+    };
+    makeStream();
+    std::size_t const failures = tests::support::failEachAllocationOf([&] { ByteStreamDevice const device(stream); },
+                                                                      [&] {
+                                                                          EXPECT_EQ(stream, nullptr);
+                                                                          EXPECT_EQ(destroyed, made);
+                                                                          makeStream();
+                                                                      });
+    EXPECT_GT(failures, 0u);
+    EXPECT_EQ(destroyed, made) << "the device that could be made has gone too";
+}
+
+TEST(FailingAllocation, LeavesNoHalfMadeException)
+{
+    EXPECT_GT(failEachAllocationOf([] {
+                  Exception const exception(ErrorCode::IOError, here);
+                  EXPECT_EQ(exception.getErrorCode(), ErrorCode::IOError);
+              }),
+              1u);
+    EXPECT_GT(failEachAllocationOf([] { ChangeEventsNotSupportedException const exception(here); }), 0u);
+}
+
+TEST(FailingAllocation, LeavesTheExceptionWhoseTextCannotBeMadeAsItWas)
+{
+    Exception const exception(ErrorCode::IOError, here);
+    std::u16string const text = exception.ToUstringImpl();
+    std::size_t const failures =
+        tests::support::failEachAllocationOf([&] { EXPECT_FALSE(exception.ToUstringImpl().empty()); },
+                                             [&] {
+                                                 EXPECT_EQ(exception.getErrorCode(), ErrorCode::IOError);
+                                                 EXPECT_EQ(exception.ToUstringImpl(), text);
+                                             });
+    EXPECT_GT(failures, 0u);
+}
+
+TEST(FailingAllocation, LeavesTheExceptionThatCannotBeClonedAsItWas)
+{
+    Exception const exception(ErrorCode::IOError, here);
+    EXPECT_GT(failEachAllocationOf([&] { std::unique_ptr<core::except::IException> const copy(exception.clone()); }),
+              0u);
+    EXPECT_EQ(exception.getStorageIRI(), here);
+}
+
+TEST(FailingAllocation, LeavesADeferredFlagToBeAskedAgain)
+{
+    int calls = 0;
+    std::unique_ptr<int> made;
+    detail::Lazy<bool> flag(detail::Lazy<bool>::Value(std::function<bool()>([&] {
+        ++calls;
+        made = std::make_unique<int>(1);
+        return true;
+    })));
+    std::size_t const failures = failEachAllocationOf([&flag] { EXPECT_TRUE(flag()); });
+    EXPECT_GT(failures, 0u);
+    EXPECT_EQ(calls, static_cast<int>(failures) + 1);
+}
+
+TEST(FailingAllocation, DuringACopyLeavesTheSource)
+{
+    MinimalProvider store;
+    StorageIRI const target(here.getParent(), u"another-file-with-a-long-name.txt");
+    store.folders = {here.getParent()};
+    store.put(here, "content");
+    std::size_t const failures =
+        tests::support::failEachAllocationOf([&] { store.copyFile(here, target, ReplacementPolicy::Overwrite); },
+                                             [&] { EXPECT_EQ(store.content(here), "content"); });
+    EXPECT_GT(failures, 0u);
+    EXPECT_EQ(store.content(target), "content");
+}
+
+TEST(FailingAllocation, DuringAnAbortedWriteLeavesTheTarget)
+{
+    MinimalProvider store;
+    store.folders = {here.getParent()};
+    store.put(here, "old");
+    std::size_t const failures = tests::support::failEachAllocationOf(
+        [&] {
+            auto const stream = store.openTransactionalStream(here, {});
+            stream->write("new", 3);
+        },
+        [&] { EXPECT_EQ(store.content(here), "old"); });
+    EXPECT_GT(failures, 0u);
+    EXPECT_EQ(store.content(here), "old");
+}
+
+} // namespace
+} // namespace foundation::storage::provider

@@ -1,0 +1,70 @@
+#include <tests/support/allocations.hpp>
+
+#include <cstdlib>
+
+// Replaces the allocation functions of the whole process, so that the libraries under test are counted too.
+
+namespace {
+
+thread_local std::size_t calls = 0;
+thread_local std::size_t callToFail = 0; // 0: none
+
+void* allocate(std::size_t size)
+{
+    ++calls;
+    void* const memory = calls == callToFail ? nullptr : std::malloc(size == 0 ? 1 : size);
+    if (memory == nullptr)
+        throw std::bad_alloc();
+    return memory;
+}
+
+} // namespace
+
+namespace foundation::tests::support {
+
+std::size_t allocations()
+{
+    return calls;
+}
+
+FailingAllocation::FailingAllocation(std::size_t number)
+{
+    callToFail = calls + number;
+}
+
+FailingAllocation::~FailingAllocation()
+{
+    callToFail = 0;
+}
+
+} // namespace foundation::tests::support
+
+void* operator new(std::size_t size)
+{
+    return allocate(size);
+}
+
+void* operator new[](std::size_t size)
+{
+    return allocate(size);
+}
+
+void operator delete(void* memory) noexcept
+{
+    std::free(memory);
+}
+
+void operator delete[](void* memory) noexcept
+{
+    std::free(memory);
+}
+
+void operator delete(void* memory, std::size_t) noexcept
+{
+    std::free(memory);
+}
+
+void operator delete[](void* memory, std::size_t) noexcept
+{
+    std::free(memory);
+}

@@ -1,0 +1,89 @@
+#include <tests/tools/storage/ToolTest.hpp>
+
+namespace {
+
+using Location = ToolTest;
+
+TEST_F(Location, IsARelativePath)
+{
+    makeFolder("a");
+    folder.write("a/b", "content");
+    EXPECT_EQ(runWell({"cat", "a/b"}), "content");
+    EXPECT_EQ(runWell({"cat", "./a/../a//b"}), "content");
+}
+
+TEST_F(Location, IsAnAbsolutePath)
+{
+    EXPECT_EQ(runWell({"cat", folder.write("a", "content")}), "content");
+}
+
+TEST_F(Location, IsAnIRI)
+{
+    folder.write("a b#?%", "content");
+    std::string const iri = "file://" + folder.path().native() + "/a%20b%23%3F%25";
+    EXPECT_EQ(runWell({"cat", iri}), "content");
+    EXPECT_EQ(runWell({"cat", "FILE" + iri.substr(4)}), "content");
+}
+
+TEST_F(Location, PathsAreNeverUnescaped)
+{
+    folder.write("a%20b", "content");
+    EXPECT_EQ(runWell({"cat", "a%20b"}), "content");
+}
+
+TEST_F(Location, OfAnUnknownSchemeSaysHowToWriteAPath)
+{
+    folder.write("a:b", "content");
+    runFailing({"cat", "a:b"}, "storage: cat: a:b: no store serves the scheme 'a' (for a local path, write ./a:b)\n");
+    EXPECT_EQ(runWell({"cat", "./a:b"}), "content");
+}
+
+TEST_F(Location, WithAColonAfterASlashIsAPath)
+{
+    makeFolder("d");
+    folder.write("d/a:b", "content");
+    folder.write("1:b", "content");
+    EXPECT_EQ(runWell({"cat", "d/a:b"}), "content");
+    EXPECT_EQ(runWell({"cat", "1:b"}), "content");
+}
+
+TEST_F(Location, IsNeverEmpty)
+{
+    runFailing({"ls", ""}, "storage: ls: '': an empty path names nothing\n");
+}
+
+TEST_F(Location, OnAnotherMachineIsRefused)
+{
+    ProgramResult const result = run({"ls", "file://elsewhere/tmp"});
+    EXPECT_EQ(result.status, 1);
+    EXPECT_TRUE(result.errors.starts_with("storage: ls: file://elsewhere/tmp: not a possible location"));
+}
+
+TEST_F(Location, WithAQueryOrFragmentSaysHowToWriteTheName)
+{
+    for (std::string const iri : {"file:///a?b", "file:///a#b"})
+        runFailing({"ls", iri},
+                   "storage: ls: " + iri + ": a '?' or '#' that belongs to a name is written %3F or %23\n");
+}
+
+TEST_F(Location, ThatIsNotUtf8IsRefusedAsAnIRI)
+{
+    ProgramResult const result = run({"ls", "file:///\xff"});
+    EXPECT_EQ(result.status, 1);
+    EXPECT_TRUE(result.errors.starts_with("storage: ls: file:///\\377: not a location: ")) << result.errors;
+}
+
+TEST_F(Location, BelowAnIRIIsShownAsAnIRI)
+{
+    makeFolder("a");
+    makeLink("nowhere", "a/b c");
+    std::string const iri = "file://" + folder.path().native();
+    runFailing({"cp", "-r", iri + "/a", "b"}, "storage: cp: " + iri + "/a/b%20c: a broken link, not copied\n");
+}
+
+TEST_F(Location, InAMessageIsShownOnOneLine)
+{
+    runFailing({"cat", "a\nb\\\033"}, "storage: cat: a\\nb\\\\\\033: no such file or folder\n");
+}
+
+} // namespace

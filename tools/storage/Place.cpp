@@ -1,0 +1,56 @@
+#include <tools/storage/Place.hpp>
+
+#include <fl/filesystem/native_name.hpp>
+#include <fl/i18n/utf8.hpp>
+
+#include <algorithm>
+#include <utility>
+
+namespace foundation::storage::tool {
+
+namespace {
+
+bool isLetter(char c)
+{
+    return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z');
+}
+
+bool isSchemeCharacter(char c)
+{
+    return isLetter(c) || (c >= '0' && c <= '9') || c == '+' || c == '-' || c == '.';
+}
+
+std::string childText(std::string text, std::u16string const& name, provider::StorageItem const& item)
+{
+    if (isIRI(text))
+        return fl::i18n::to_utf8(item.getLocation().toString(), fl::i18n::Malformed::Replace);
+    if (!text.ends_with('/'))
+        text += '/';
+    return text + fl::filesystem::to_native_bytes(name);
+}
+
+} // namespace
+
+bool isIRI(std::string const& argument)
+{
+    if (argument.empty() || !isLetter(argument.front()))
+        return false;
+    auto const end = std::find_if_not(argument.begin(), argument.end(), isSchemeCharacter);
+    return end != argument.end() && *end == ':';
+}
+
+Place::Place(provider::StorageItem item, std::string text) : item_(std::move(item)), text_(std::move(text)) {}
+
+bool Place::saysFolder() const
+{
+    return text_.ends_with('/');
+}
+
+Place Place::child(std::u16string const& name) const
+{
+    provider::StorageItem item(item_, name);
+    std::string text = childText(text_, name, item);
+    return Place(std::move(item), std::move(text));
+}
+
+} // namespace foundation::storage::tool

@@ -1,0 +1,36 @@
+#pragma once
+
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace CLI {
+class App;
+class FormatterBase;
+} // namespace CLI
+
+namespace foundation::storage::tool {
+
+/// The arguments of the program as the parser gets them, in reverse order as it wants them. Operands and values are
+/// marked, because the parser would take some for something else: it splits "[a,b]" and swallows "{}" and "%%", which
+/// are names like any other.
+std::vector<std::string> markedArguments(int count, char const* const* arguments);
+
+/// The text without marks: an argument that the parser hands back, or a message of the parser about one.
+std::string unmarked(std::string text);
+
+/// Lays out the help.
+std::shared_ptr<CLI::FormatterBase> makeHelpFormatter();
+
+/// Declares a flag, which sets `value`. What these functions fill must live until the command line is parsed.
+void addFlag(CLI::App& app, std::string const& name, bool& value, std::string const& description);
+
+/// Declares the operands of a command, which go to `values`. `name` is how the usage line shows them all.
+void addOperands(CLI::App& app, std::string const& name, std::string const& description, std::size_t minimum,
+                 std::vector<std::string>& values);
+
+/// Declares an option whose value is one of a few words.
+void addChoice(CLI::App& app, std::string const& name, std::string const& description,
+               std::vector<std::string> const& choices, std::string& value);
+
+} // namespace foundation::storage::tool

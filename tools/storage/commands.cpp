@@ -1,0 +1,22 @@
+#include <tools/storage/commands.hpp>
+
+#include <array>
+
+namespace foundation::storage::tool {
+
+std::span<Command const> commands()
+{
+    static constexpr std::array table{
+        Command{"ls", "List folders", defineLs},
+        Command{"tree", "Draw a folder and all below it", defineTree},
+        Command{"stat", "Say what is known of files and folders", defineStat},
+        Command{"cat", "Write files to standard output", defineCat},
+        Command{"cp", "Copy files and folders, each file whole or not at all", defineCp},
+        Command{"mv", "Move or rename files and folders", defineMv},
+        Command{"rm", "Remove files and folders", defineRm},
+        Command{"mkdir", "Make folders", defineMkdir},
+    };
+    return table;
+}
+
+} // namespace foundation::storage::tool

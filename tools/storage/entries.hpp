@@ -1,0 +1,34 @@
+#pragma once
+
+#include <boost/date_time/posix_time/posix_time_types.hpp>
+#include <storage/provider/FolderEntry.hpp>
+#include <tools/storage/Place.hpp>
+#include <tools/storage/kinds.hpp>
+
+#include <cstdint>
+#include <optional>
+#include <string>
+
+namespace foundation::storage::tool {
+
+/// What the tool tells of a file or folder; what it was not asked for or does not exist is empty.
+struct Entry
+{
+    std::u16string name;
+    provider::StorageIRI location;
+    Kind kind;
+    std::optional<std::uint64_t> size;
+    std::optional<boost::posix_time::ptime> modified;
+    std::optional<bool> isWritable;
+};
+
+/// All of it, asked from the store; failures name the place, be it that nothing is there.
+Entry describeEntry(Place const& place);
+
+/// What a listing said of a place.
+Entry describeEntry(Place const& place, Kind kind, provider::FolderEntry const& listed);
+
+/// One JSON object, without the members that are empty.
+std::string toJSON(Entry const& entry);
+
+} // namespace foundation::storage::tool

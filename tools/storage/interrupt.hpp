@@ -1,0 +1,18 @@
+#pragma once
+
+namespace foundation::storage::tool {
+
+/// The user asked to stop. Not a `std::exception`, so that it passes whatever handles failures.
+struct Interrupted
+{
+    int signal;
+};
+
+/// Makes SIGINT, SIGTERM and SIGHUP requests to stop, which work looks for between two steps. The third one ends the
+/// program at once, for when a step does not end. A signal that was ignored stays so.
+void catchInterrupts();
+
+/// Throws `Interrupted` when the user asked to stop.
+void checkInterrupt();
+
+} // namespace foundation::storage::tool

@@ -1,0 +1,24 @@
+#pragma once
+
+#include <storage/provider/ExistenceType.hpp>
+#include <tools/storage/Place.hpp>
+
+namespace foundation::storage::tool {
+
+using Kind = provider::ExistenceTypeExtended;
+
+/// What a place holds; failures name it.
+Kind kindOf(Place const& place);
+
+/// The same, where nothing is a failure.
+Kind existingKindOf(Place const& place);
+
+/// "file", "folder", "link-to-file" and so on: the words of listings and of JSON.
+char const* kindName(Kind kind);
+
+/// A file or a folder, be it reached through a link.
+bool leadsToFile(Kind kind);
+bool leadsToFolder(Kind kind);
+bool isLink(Kind kind);
+
+} // namespace foundation::storage::tool
