@@ -107,7 +107,9 @@ void Process::start(std::vector<std::string> const& command, ProcessOptions cons
         return;
     if (!options.output.empty())
         output = ::open(options.output.c_str(), O_WRONLY | O_CLOEXEC);
-    bool const isReady = ::dup2(output, STDOUT_FILENO) != -1 && ::dup2(errors, STDERR_FILENO) != -1 &&
+    int const input = options.input.empty() ? STDIN_FILENO : ::open(options.input.c_str(), O_RDONLY | O_CLOEXEC);
+    bool const isReady = ::dup2(input, STDIN_FILENO) != -1 && ::dup2(output, STDOUT_FILENO) != -1 &&
+                         ::dup2(errors, STDERR_FILENO) != -1 &&
                          (options.workingFolder.empty() || ::chdir(options.workingFolder.c_str()) == 0);
     if (options.prepare)
         options.prepare();

@@ -21,6 +21,9 @@ struct ProcessOptions
 {
     std::filesystem::path workingFolder = {};
 
+    /// A file that is standard input; otherwise that is the one of the test.
+    std::filesystem::path input = {};
+
     /// A file that is standard output; otherwise what comes out is collected.
     std::filesystem::path output = {};
 

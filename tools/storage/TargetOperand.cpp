@@ -14,8 +14,7 @@ TargetOperand::TargetOperand(Place place, std::size_t sourceCount)
         return;
     if (sourceCount > 1)
         throw Failure{place_.text(), "not a folder, which it must be for several sources"};
-    if (!place_.item().hasParent() || !leadsToFolder(kindOf(Place(place_.item().getParent(), place_.text()))))
-        throw Failure{place_.text(), "there is no folder to hold it"};
+    requireParentFolder(place_);
 }
 
 Place TargetOperand::nameFor(Place const& source) const

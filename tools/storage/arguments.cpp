@@ -77,6 +77,12 @@ void addOperands(CLI::App& app, std::string const& name, std::string const& desc
     option->required(minimum > 0);
 }
 
+void addOperand(CLI::App& app, std::string const& name, std::string const& description, std::string& value)
+{
+    auto const take = [&value](std::string const& argument) { value = withoutMark(argument); };
+    app.add_option_function<std::string>(name, take, description)->type_name("")->required();
+}
+
 void addChoice(CLI::App& app, std::string const& name, std::string const& description,
                std::vector<std::string> const& choices, std::string& value)
 {

@@ -29,6 +29,9 @@ void addFlag(CLI::App& app, std::string const& name, bool& value, std::string co
 void addOperands(CLI::App& app, std::string const& name, std::string const& description, std::size_t minimum,
                  std::vector<std::string>& values);
 
+/// Declares the only operand of a command.
+void addOperand(CLI::App& app, std::string const& name, std::string const& description, std::string& value);
+
 /// Declares an option whose value is one of a few words.
 void addChoice(CLI::App& app, std::string const& name, std::string const& description,
                std::vector<std::string> const& choices, std::string& value);

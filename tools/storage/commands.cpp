@@ -11,6 +11,7 @@ std::span<Command const> commands()
         Command{"tree", "Draw a folder and all below it", defineTree},
         Command{"stat", "Say what is known of files and folders", defineStat},
         Command{"cat", "Write files to standard output", defineCat},
+        Command{"put", "Write standard input to a file, whole or not at all", definePut},
         Command{"cp", "Copy files and folders, each file whole or not at all", defineCp},
         Command{"mv", "Move or rename files and folders", defineMv},
         Command{"rm", "Remove files and folders", defineRm},

@@ -11,6 +11,7 @@ Action defineCp(CLI::App& app);
 Action defineLs(CLI::App& app);
 Action defineMkdir(CLI::App& app);
 Action defineMv(CLI::App& app);
+Action definePut(CLI::App& app);
 Action defineRm(CLI::App& app);
 Action defineStat(CLI::App& app);
 Action defineTree(CLI::App& app);

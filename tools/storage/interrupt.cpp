@@ -1,13 +1,15 @@
 #include <tools/storage/interrupt.hpp>
 
+#include <cerrno>
 #include <csignal>
-#include <initializer_list>
+#include <poll.h>
 
 namespace foundation::storage::tool {
 
 namespace {
 
 constexpr int patience = 3;
+constexpr int caughtSignals[]{SIGINT, SIGTERM, SIGHUP};
 
 std::sig_atomic_t volatile pendingSignal = 0;
 std::sig_atomic_t volatile signalCount = 0;
@@ -21,6 +23,28 @@ extern "C" void rememberSignal(int signal)
         std::raise(signal);
     }
 }
+
+/// Holds interrupts back while it lives.
+class HeldInterrupts
+{
+public:
+    HeldInterrupts()
+    {
+        sigset_t held;
+        sigemptyset(&held);
+        for (int const signal : caughtSignals)
+            sigaddset(&held, signal);
+        pthread_sigmask(SIG_BLOCK, &held, &before_);
+    }
+    ~HeldInterrupts() { pthread_sigmask(SIG_SETMASK, &before_, nullptr); }
+    HeldInterrupts(HeldInterrupts const&) = delete;
+    HeldInterrupts& operator=(HeldInterrupts const&) = delete;
+
+    sigset_t const& maskBefore() const { return before_; }
+
+private:
+    sigset_t before_;
+};
 
 void catchInterrupt(int signal)
 {
@@ -38,7 +62,7 @@ void catchInterrupt(int signal)
 
 void catchInterrupts()
 {
-    for (int const signal : {SIGINT, SIGTERM, SIGHUP})
+    for (int const signal : caughtSignals)
         catchInterrupt(signal);
 }
 
@@ -46,6 +70,15 @@ void checkInterrupt()
 {
     if (int const signal = pendingSignal; signal != 0)
         throw Interrupted{signal};
+}
+
+void waitForInput(int descriptor)
+{
+    HeldInterrupts const held;
+    pollfd wanted{descriptor, POLLIN, 0};
+    do
+        checkInterrupt();
+    while (::ppoll(&wanted, 1, nullptr, &held.maskBefore()) == -1 && errno == EINTR);
 }
 
 } // namespace foundation::storage::tool

@@ -15,4 +15,8 @@ void catchInterrupts();
 /// Throws `Interrupted` when the user asked to stop.
 void checkInterrupt();
 
+/// Waits until a descriptor can be read. Throws `Interrupted` at once when the signal comes, be it just before the
+/// wait.
+void waitForInput(int descriptor);
+
 } // namespace foundation::storage::tool

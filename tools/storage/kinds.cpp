@@ -17,6 +17,12 @@ Kind existingKindOf(Place const& place)
     return kind;
 }
 
+void requireParentFolder(Place const& place)
+{
+    if (!place.item().hasParent() || !leadsToFolder(kindOf(Place(place.item().getParent(), place.text()))))
+        throw Failure{place.text(), "there is no folder to hold it"};
+}
+
 char const* kindName(Kind kind)
 {
     switch (kind) {

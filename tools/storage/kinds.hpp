@@ -13,6 +13,9 @@ Kind kindOf(Place const& place);
 /// The same, where nothing is a failure.
 Kind existingKindOf(Place const& place);
 
+/// Throws `Failure` unless the folder is there that holds the place, or is to hold it.
+void requireParentFolder(Place const& place);
+
 /// "file", "folder", "link-to-file" and so on: the words of listings and of JSON.
 char const* kindName(Kind kind);
 
