@@ -45,6 +45,23 @@ void checkName(std::string const& encoding)
     }
 }
 
+// ICU's own callbacks skip characters that are not drawn (joiners, variation selectors), even where they are to stop.
+// The failure that ICU reports stays as it is.
+void U_CALLCONV refuseUnmappable(void const* /*context*/, UConverterFromUnicodeArgs* /*arguments*/,
+                                 UChar const* /*units*/, std::int32_t /*length*/, UChar32 /*codePoint*/,
+                                 UConverterCallbackReason /*reason*/, UErrorCode* /*status*/)
+{}
+
+void U_CALLCONV replaceUnmappable(void const* /*context*/, UConverterFromUnicodeArgs* arguments, UChar const* /*units*/,
+                                  std::int32_t /*length*/, UChar32 /*codePoint*/, UConverterCallbackReason reason,
+                                  UErrorCode* status)
+{
+    if (reason <= UCNV_IRREGULAR) {
+        *status = U_ZERO_ERROR;
+        ucnv_cbFromUWriteSub(arguments, 0, status);
+    }
+}
+
 // ICU's own substitution writes a control character for some malformed bytes.
 void U_CALLCONV replaceMalformed(void const* /*context*/, UConverterToUnicodeArgs* arguments, char const* /*bytes*/,
                                  std::int32_t /*length*/, UConverterCallbackReason reason, UErrorCode* status)
@@ -79,8 +96,8 @@ std::string encode(std::u16string const& text, detail::Codec const& codec)
 {
     Converter const converter = openConverter(codec.encoding());
     UErrorCode status = U_ZERO_ERROR;
-    auto const onMalformed = codec.isStrict() ? UCNV_FROM_U_CALLBACK_STOP : UCNV_FROM_U_CALLBACK_SUBSTITUTE;
-    ucnv_setFromUCallBack(converter.get(), onMalformed, nullptr, nullptr, nullptr, &status);
+    auto const onUnmappable = codec.isStrict() ? refuseUnmappable : replaceUnmappable;
+    ucnv_setFromUCallBack(converter.get(), onUnmappable, nullptr, nullptr, nullptr, &status);
     auto const length = checkedLength(text.size());
     std::string result(
         static_cast<std::size_t>(UCNV_GET_MAX_BYTES_FOR_STRING(length, ucnv_getMaxCharSize(converter.get()))), '\0');

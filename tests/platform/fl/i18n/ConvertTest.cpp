@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstddef>
 #include <stdexcept>
 #include <string>
 
@@ -75,9 +76,37 @@ TEST(Convert, StrictConverterRefusesWhatTheEncodingCannotHold)
     EXPECT_THROW(static_cast<void>(to_ustring("\x81", codecvt_string_to_ustring("Shift_JIS", true))), std::range_error);
 }
 
+TEST(Convert, StrictConverterKeepsEveryCharacterOrRefuses)
+{
+    for (std::string const name : {"IBM437", "ISO-8859-1"}) {
+        codecvt_ustring_to_string const toString(name, true);
+        codecvt_string_to_ustring const toUstring(name, true);
+        std::size_t kept = 0;
+        for (char32_t unit = 0; unit <= 0xFFFF; ++unit) {
+            std::u16string const text = {u'a', static_cast<char16_t>(unit), u'z'};
+            try {
+                ASSERT_EQ(to_ustring(to_string(text, toString), toUstring), text) << name << ' ' << unsigned{unit};
+                ++kept;
+            } catch (std::range_error const&) {
+            }
+        }
+        EXPECT_EQ(kept, 256u) << name;
+    }
+}
+
+TEST(Convert, StrictConverterRefusesCharactersThatAreNotDrawn)
+{
+    codecvt_ustring_to_string const strict("Shift_JIS", true);
+    for (std::u16string const text : {u"a\u200Dz", u"a\uFE0Fz", u"a\uFEFFz", u"a\U000E0041z"})
+        EXPECT_THROW(static_cast<void>(to_string(text, strict)), std::range_error);
+}
+
 TEST(Convert, LenientConverterReplacesWhatTheEncodingCannotHold)
 {
     EXPECT_EQ(to_string(u"a\u4E2Dz", codecvt_ustring_to_string("ISO-8859-1", false)), "a\x1Az");
+    EXPECT_EQ(to_string(u"a\u200Dz", codecvt_ustring_to_string("ISO-8859-1", false)), "a\x1Az");
+    EXPECT_EQ(to_string(std::u16string{u'a', char16_t{0xD800}}, codecvt_ustring_to_string("ISO-8859-1", false)),
+              "a\x1A");
     EXPECT_EQ(to_ustring("a\x81", codecvt_string_to_ustring("Shift_JIS", false)), u"a\uFFFD");
 }
 
