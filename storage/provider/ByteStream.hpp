@@ -34,7 +34,7 @@ protected:
     virtual long doRead(char* buffer, long count) = 0;
     virtual long doWrite(char const* data, long count) = 0;
     virtual long doSeek(long offset, std::ios_base::seekdir direction) = 0;
-    virtual void doClose() = 0;
+    virtual void doClose() = 0; ///< does nothing for a closed stream: a commit that is tried again closes again
 };
 
 } // namespace foundation::storage::provider

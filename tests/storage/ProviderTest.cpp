@@ -19,13 +19,14 @@ TEST(Provider, OneHeaderOffersTheWholeCore)
     EXPECT_EQ(
         (count<ByteStream, ByteStreamAccess, ByteStreamAppend, ByteStreamCreate, ByteStreamDevice, ByteStreamFailure,
                ByteStreamOpenOptions, ByteStreamTruncate, ByteStreamWriteFailure, CaseModifier, ChangeEventCallback,
-               ChangeEventsNotSupportedException, ChangeEventsSubscriptionException, CopyFileOptions, ErrorCode,
-               ErrorCodeInfo, Exception, ExistenceType, ExistenceTypeExtended, ExtendedAttributes, ExtendedFeature,
-               FileAttributes, FilenameSensitivity, FolderAttributes, FolderEntry, GenericByteStreamDevice<ByteStream>,
-               IFolderEntryIterator, IProvider, InterruptSignal, PathComparator, PathView, PathViewIterator,
+               ChangeEventsNotSupportedException, ChangeEventsSubscriptionException, ContainerProviderFactory,
+               CopyFileOptions, ErrorCode, ErrorCodeInfo, Exception, ExistenceType, ExistenceTypeExtended,
+               ExtendedAttributes, ExtendedFeature, FileAttributes, FilenameSensitivity, FolderAttributes, FolderEntry,
+               GenericByteStreamDevice<ByteStream>, IConfigurableProvider, IFolderEntryIterator, IProvider,
+               IReadOnlyProvider, InterruptSignal, PathComparator, PathView, PathViewIterator, PhysicalProviderFactory,
                ReplacementPolicy, StorageIRI, StorageIRIInfo, StorageItem, StreamClosePolicy, TagErrorCode,
                TagStorageIRI, TransactionPolicy, TransactionStatus, TransactionalStream, TransactionalStreamDevice>()),
-        43u);
+        47u);
 }
 
 } // namespace

@@ -35,6 +35,9 @@ static_assert(std::is_same_v<decltype(&ByteStreamFailure::what), char const* (By
 static_assert(std::is_base_of_v<ByteStreamFailure, ByteStreamWriteFailure>);
 static_assert(std::is_default_constructible_v<ByteStreamWriteFailure>);
 static_assert(sizeof(ByteStreamWriteFailure) == sizeof(ByteStreamFailure));
+static_assert(std::is_same_v<decltype(&ByteStreamWriteFailure::clone), //
+                             IException* (ByteStreamWriteFailure::*)() const>);
+static_assert(std::is_same_v<decltype(&ByteStreamWriteFailure::rethrow), void (ByteStreamWriteFailure::*)() const>);
 
 // A failure that says what the class itself says.
 std::string standardText(std::string const& message, std::error_code const& error)

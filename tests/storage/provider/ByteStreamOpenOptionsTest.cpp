@@ -7,6 +7,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <ostream>
+#include <string>
 #include <type_traits>
 
 namespace foundation::storage::provider {
@@ -44,6 +45,7 @@ void expectTwoNames(Enumeration zero, Enumeration one, char const* zeroText, cha
     for (int const value : {1, 2, 7, -1})
         EXPECT_EQ(printed(static_cast<Enumeration>(value)), otherText) << value;
     EXPECT_TRUE(answersItsStream(one));
+    EXPECT_EQ(printedInField(zero, static_cast<int>(std::string(zeroText).size()) + 2), std::string("..") + zeroText);
 }
 
 TEST(ByteStreamAccess, PrintsTheSecondNameForEveryValueButZero)

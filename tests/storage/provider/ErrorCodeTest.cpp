@@ -16,6 +16,7 @@ namespace {
 using namespace tests::support;
 
 static_assert(std::is_same_v<std::underlying_type_t<ErrorCode>, std::int32_t>);
+static_assert(!std::is_convertible_v<ErrorCode, int>);
 static_assert(isDeclared<static_cast<std::ostream& (*)(std::ostream&, ErrorCode const&)>(&operator<<)>);
 static_assert(isDeclared<static_cast<std::string (*)(ErrorCode)>(&toString)>);
 

@@ -17,6 +17,7 @@ using namespace tests::support;
 
 static_assert(std::is_same_v<std::underlying_type_t<ExistenceType>, std::int32_t>);
 static_assert(std::is_same_v<std::underlying_type_t<ExistenceTypeExtended>, std::int32_t>);
+static_assert(!std::is_convertible_v<ExistenceType, int> && !std::is_convertible_v<ExistenceTypeExtended, int>);
 static_assert(static_cast<int>(ExistenceType::AsFile) == 0);
 static_assert(static_cast<int>(ExistenceType::AsFolder) == 1);
 static_assert(static_cast<int>(ExistenceType::AsNeither) == 2);

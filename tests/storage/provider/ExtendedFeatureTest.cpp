@@ -15,6 +15,7 @@ namespace {
 using namespace tests::support;
 
 static_assert(std::is_same_v<std::underlying_type_t<ExtendedFeature>, std::int32_t>);
+static_assert(!std::is_convertible_v<ExtendedFeature, int>);
 static_assert(static_cast<int>(ExtendedFeature::RecursiveFolderRemoval) == 0);
 static_assert(static_cast<int>(ExtendedFeature::AtomicFileCopy) == 5);
 static_assert(isDeclared<static_cast<std::ostream& (*)(std::ostream&, ExtendedFeature)>(&operator<<)>);

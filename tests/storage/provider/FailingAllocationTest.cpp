@@ -6,6 +6,7 @@
 #include <tests/support/MinimalProvider.hpp>
 #include <tests/support/RecordingByteStream.hpp>
 #include <tests/support/allocations.hpp>
+#include <tests/support/locationWithText.hpp>
 
 #include <gtest/gtest.h>
 
@@ -50,12 +51,18 @@ TEST(FailingAllocation, DestroysTheStreamThatADeviceCannotShare)
 
 TEST(FailingAllocation, LeavesNoHalfMadeException)
 {
-    EXPECT_GT(failEachAllocationOf([] {
-                  Exception const exception(ErrorCode::IOError, here);
-                  EXPECT_EQ(exception.getErrorCode(), ErrorCode::IOError);
-              }),
-              1u);
-    EXPECT_GT(failEachAllocationOf([] { ChangeEventsNotSupportedException const exception(here); }), 0u);
+    auto const text = std::make_shared<TextOnlyImpl>(u"a/b");
+    StorageIRI const location(text);
+    long const owners = text.use_count();
+    auto const nobodyElseHoldsTheLocation = [&] { EXPECT_EQ(text.use_count(), owners); };
+    auto const makeException = [&] {
+        Exception const exception(ErrorCode::IOError, location);
+        EXPECT_EQ(exception.getErrorCode(), ErrorCode::IOError);
+    };
+    auto const makeChangeEventException = [&] { ChangeEventsNotSupportedException const exception(location); };
+    EXPECT_GT(tests::support::failEachAllocationOf(makeException, nobodyElseHoldsTheLocation), 1u);
+    EXPECT_GT(tests::support::failEachAllocationOf(makeChangeEventException, nobodyElseHoldsTheLocation), 0u);
+    nobodyElseHoldsTheLocation();
 }
 
 TEST(FailingAllocation, LeavesTheExceptionWhoseTextCannotBeMadeAsItWas)

@@ -13,6 +13,7 @@ using boost::posix_time::ptime;
 using EntryType = FolderEntry::EntryType;
 
 static_assert(std::is_same_v<std::underlying_type_t<EntryType>, std::int32_t>);
+static_assert(!std::is_convertible_v<EntryType, int>);
 static_assert(static_cast<int>(EntryType::File) == 0);
 static_assert(static_cast<int>(EntryType::Folder) == 1);
 static_assert(std::is_same_v<decltype(&FolderEntry::getName), std::u16string const& (FolderEntry::*)() const>);

@@ -20,6 +20,7 @@ using tests::support::VectorListing;
 
 static_assert(std::is_abstract_v<IFolderEntryIterator>);
 static_assert(std::has_virtual_destructor_v<IFolderEntryIterator>);
+static_assert(sizeof(IFolderEntryIterator) == sizeof(void*));
 static_assert(std::is_same_v<decltype(&IFolderEntryIterator::hasEntry), bool (IFolderEntryIterator::*)() const>);
 static_assert(
     std::is_same_v<decltype(&IFolderEntryIterator::entry), FolderEntry const& (IFolderEntryIterator::*)() const>);

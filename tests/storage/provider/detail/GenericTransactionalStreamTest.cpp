@@ -235,14 +235,17 @@ TEST_F(GenericTransactionalStreams, CloseOutOfTheFinisherDoesNothing)
     EXPECT_EQ(log, (CallLog{"stream.close()", "finish(StreamClosePolicy::Commit)"}));
 }
 
-TEST_F(GenericTransactionalStreams, FinisherIsReleasedBeforeTheStreamOrWithIt)
+TEST_F(GenericTransactionalStreams, DroppingReleasesTheFinisherBeforeTheStream)
 {
-    auto const held = std::make_shared<int>(0);
-    {
-        Stream const holder(std::make_unique<RecordingByteStream>(), [held](StreamClosePolicy const&) {});
-        EXPECT_EQ(held.use_count(), 2);
-    }
-    EXPECT_EQ(held.use_count(), 1);
+    CallLog calls;
+    auto underlying = std::make_unique<RecordingByteStream>();
+    underlying->onDestruction = [&calls] { calls.emplace_back("stream"); };
+    std::shared_ptr<void> held(nullptr, [&calls](void*) { calls.emplace_back("finisher"); });
+    auto holder =
+        std::make_unique<Stream>(std::move(underlying), [held = std::move(held)](StreamClosePolicy const&) {});
+    EXPECT_TRUE(calls.empty());
+    holder.reset();
+    EXPECT_EQ(calls, (CallLog{"finisher", "stream"}));
 }
 
 // Closes `stream` from many threads at once, with either policy.
@@ -263,6 +266,28 @@ TEST(GenericTransactionalStreamConcurrency, OneOfManyClosingThreadsRunsTheFinish
         EXPECT_EQ(closed, 1);
         EXPECT_EQ(finished, 1);
     }
+}
+
+TEST(GenericTransactionalStreamConcurrency, FailedCloseIsTriedAgainByOneThreadAtATime)
+{
+    int calls = 0; // not atomic: one thread at a time closes, and the next one sees what it did
+    std::atomic<int> failures = 0;
+    Stream stream(std::make_unique<RecordingByteStream>(), [&calls](StreamClosePolicy const&) {
+        if (++calls <= 5)
+            throw std::runtime_error("not now");
+    });
+    auto const closeUntilItAnswers = [&stream, &failures] {
+        for (;;) {
+            try {
+                return stream.close(commit);
+            } catch (std::runtime_error const&) {
+                ++failures;
+            }
+        }
+    };
+    inThreads(32, [&closeUntilItAnswers](int) { closeUntilItAnswers(); });
+    EXPECT_EQ(failures, 5);
+    EXPECT_EQ(calls, 6);
 }
 
 TEST(GenericTransactionalStreamConcurrency, WhatOneThreadWroteIsSeenByTheThreadThatCloses)

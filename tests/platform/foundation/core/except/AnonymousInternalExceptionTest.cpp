@@ -12,6 +12,7 @@
 #include <typeinfo>
 
 #include <tests/support/ErrorInfo.hpp>
+#include <tests/support/slotOf.hpp>
 
 namespace foundation::core::except::detail {
 namespace {
@@ -25,6 +26,8 @@ using RuntimeError = AnonymousInternalException<std::runtime_error>;
 static_assert(std::is_base_of_v<Exception<IInternalException, std::logic_error, void>, LogicError>);
 static_assert(std::is_base_of_v<Exception<IInternalException, std::runtime_error, void>, RuntimeError>);
 static_assert(!std::is_convertible_v<std::string, LogicError>);
+static_assert(std::is_same_v<decltype(&LogicError::clone), IException* (LogicError::*)() const>);
+static_assert(std::is_same_v<decltype(&LogicError::rethrow), void (LogicError::*)() const>);
 
 // Thrown by code of the library, where the templates are instantiated.
 void throwFromLibrary(IException const& exception)
@@ -108,6 +111,18 @@ TEST(AnonymousInternalException, IsCaughtByEachOfItsBases)
     EXPECT_THROW(throwFromLibrary(exception), IInternalException);
     EXPECT_THROW(throwFromLibrary(exception), IException);
     EXPECT_THROW(throwFromLibrary(RuntimeError("message")), std::runtime_error);
+}
+
+TEST(AnonymousInternalException, VirtualFunctionsStandInTheOrderOfTheInterface)
+{
+    using tests::support::slotOf;
+    EXPECT_EQ(slotOf(&RuntimeError::clone), 0u);
+    EXPECT_EQ(slotOf(&RuntimeError::rethrow), 1u);
+    EXPECT_EQ(slotOf(&RuntimeError::what), 4u);
+    EXPECT_EQ(slotOf(&RuntimeError::ToUstringImpl), 7u);
+    RuntimeError const exception("message");
+    IException const* interface = &exception;
+    EXPECT_EQ(static_cast<void const*>(interface), static_cast<void const*>(&exception));
 }
 
 TEST(AnonymousInternalException, DiagnosticInformationNamesTypeAndMessage)

@@ -8,10 +8,10 @@
 #include <stdexcept>
 #include <string>
 #include <system_error>
-#include <thread>
 #include <vector>
 
 #include <foundation/core/except/AnonymousInternalException.hpp>
+#include <tests/support/inThreads.hpp>
 #include <tests/support/slotOf.hpp>
 
 namespace foundation::core::except {
@@ -153,16 +153,12 @@ TEST(IException, AssignmentDropsTheTextOfThePast)
     EXPECT_STREQ(interface.what(), "new");
 }
 
-TEST(IException, AllThreadsGetOneText)
+TEST(IExceptionConcurrency, AllThreadsGetOneText)
 {
     TwoVoices const exception("shared");
-    std::vector<char const*> seen(16);
-    {
-        std::vector<std::jthread> threads;
-        for (char const*& mine : seen) {
-            threads.emplace_back([&exception, &mine] { mine = static_cast<IException const&>(exception).what(); });
-        }
-    }
+    IException const& interface = exception;
+    std::vector<char const*> seen(32);
+    tests::support::inThreads(32, [&](int thread) { seen[static_cast<std::size_t>(thread)] = interface.what(); });
     EXPECT_STREQ(seen.front(), "shared");
     EXPECT_EQ(seen, std::vector<char const*>(seen.size(), seen.front()));
 }
