@@ -39,9 +39,9 @@ Converter openConverter(std::string const& encoding)
 
 void checkName(std::string const& encoding)
 {
-    // ICU reads an empty name as the default encoding of the process, and stops at a NUL.
-    if (encoding.empty() || encoding.find('\0') != std::string::npos) {
-        throw std::invalid_argument("The name of a character encoding is empty or holds a NUL.");
+    // ICU stops at a NUL.
+    if (encoding.find('\0') != std::string::npos) {
+        throw std::invalid_argument("The name of a character encoding holds a NUL.");
     }
 }
 

@@ -60,6 +60,12 @@ TEST(ByteStreamFailure, WhatIsThatOfTheStandardFailure)
     EXPECT_EQ(static_cast<std::exception const&>(failure).what(), expected);
 }
 
+TEST(ByteStreamFailure, WhatKeepsBytesThatAreNotUtf8)
+{
+    TestStreamFailure const failure(ErrorCode::IOError, "caf\xE9");
+    EXPECT_EQ(failure.what(), standardText("caf\xE9", std::make_error_code(std::errc::io_error)));
+}
+
 TEST(ByteStreamFailure, TextIsWhatInUtf16)
 {
     TestStreamFailure const failure(ErrorCode::IOError, "caf\xC3\xA9 \xFF");

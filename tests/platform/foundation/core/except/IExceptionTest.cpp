@@ -51,6 +51,23 @@ struct OwnWords : IInternalException, std::exception
     void rethrow() const override { throw OwnWords(*this); }
 };
 
+// A standard exception that asks another one before it forwards to the interface.
+struct Quoting : IInternalException, std::runtime_error
+{
+    using std::runtime_error::runtime_error;
+    char const* what() const noexcept override
+    {
+        return OwnWords().ToUstringImpl() == u"own words" ? IException::what() : "the other one lost its words";
+    }
+    IException* clone() const override { return new Quoting(*this); }
+    void rethrow() const override { throw Quoting(*this); }
+};
+
+struct Garbled : Bare
+{
+    std::u16string ToUstringImpl() const override { return {u'a', char16_t{0xD800}, u'b'}; }
+};
+
 struct Speechless : Bare
 {
     std::u16string ToUstringImpl() const override { throw std::bad_alloc(); }
@@ -125,6 +142,19 @@ TEST(IException, ForwardingWhatOfAStreamFailureKeepsTheCategoryText)
     std::ios_base::failure const reference("broken", std::make_error_code(std::io_errc::stream));
     Forwarding<std::ios_base::failure> const failure("broken", std::make_error_code(std::io_errc::stream));
     EXPECT_STREQ(failure.what(), reference.what());
+}
+
+TEST(IException, AskingOneExceptionOnBehalfOfAnotherDisturbsNeither)
+{
+    Quoting const exception("runtime");
+    EXPECT_EQ(exception.ToUstringImpl(), u"runtime");
+    EXPECT_STREQ(exception.what(), "runtime");
+}
+
+TEST(IException, WhatReplacesLoneSurrogatesOfTheText)
+{
+    EXPECT_STREQ(Garbled().what(), "a\xEF\xBF\xBD"
+                                   "b");
 }
 
 TEST(IException, WhatHasAFixedTextWhenTheTextCannotBeMade)
