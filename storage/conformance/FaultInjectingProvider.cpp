@@ -38,114 +38,30 @@ FileAttributes FaultInjectingProvider::doGetFileAttributes(StorageIRI const& iri
     return FileAttributes(*claimed, attributes.getLastModified(), [attributes] { return attributes.isWritable(); });
 }
 
-std::unique_ptr<ByteStream> FaultInjectingProvider::doOpenStream(StorageIRI const& iri,
-                                                                 ByteStreamOpenOptions const& options) const
-{
-    return faulty(ForwardingProvider::doOpenStream(iri, options), faults_);
-}
-
-std::unique_ptr<ByteStream> FaultInjectingProvider::doOpenReadOnlyStream(StorageIRI const& iri) const
-{
-    return faulty(ForwardingProvider::doOpenReadOnlyStream(iri), faults_);
-}
-
 std::unique_ptr<TransactionalStream>
 FaultInjectingProvider::doOpenTransactionalStream(StorageIRI const& iri, ByteStreamOpenOptions const& options) const
 {
     if (faults_->plan().composeTransactions)
         return IProvider::doOpenTransactionalStream(iri, options);
-    return faulty(ForwardingProvider::doOpenTransactionalStream(iri, options), faults_);
+    return ForwardingProvider::doOpenTransactionalStream(iri, options);
 }
 
-IProvider::Listing FaultInjectingProvider::doListAll(StorageIRI const& folder) const
+std::unique_ptr<ByteStream> FaultInjectingProvider::handOutStream(std::unique_ptr<ByteStream> stream,
+                                                                  StorageIRI const&) const
 {
-    return guarded(ForwardingProvider::doListAll(folder), folder);
+    return faulty(std::move(stream), faults_);
 }
 
-IProvider::Listing FaultInjectingProvider::doListAllWildcards(StorageIRI const& folder, std::u16string pattern) const
+std::unique_ptr<TransactionalStream>
+FaultInjectingProvider::handOutTransaction(std::unique_ptr<TransactionalStream> stream, StorageIRI const&) const
 {
-    return guarded(ForwardingProvider::doListAllWildcards(folder, std::move(pattern)), folder);
+    return faulty(std::move(stream), faults_);
 }
 
-IProvider::Listing FaultInjectingProvider::doListAllNamesOnly(StorageIRI const& folder) const
+IProvider::Listing FaultInjectingProvider::list(char const* name, ListingOperation operation, StorageIRI const& folder,
+                                                std::u16string pattern) const
 {
-    return guarded(ForwardingProvider::doListAllNamesOnly(folder), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListAllNamesOnlyWildcards(StorageIRI const& folder,
-                                                                       std::u16string pattern) const
-{
-    return guarded(ForwardingProvider::doListAllNamesOnlyWildcards(folder, std::move(pattern)), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListFiles(StorageIRI const& folder) const
-{
-    return guarded(ForwardingProvider::doListFiles(folder), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListFilesWildcards(StorageIRI const& folder, std::u16string pattern) const
-{
-    return guarded(ForwardingProvider::doListFilesWildcards(folder, std::move(pattern)), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListFilesNamesOnly(StorageIRI const& folder) const
-{
-    return guarded(ForwardingProvider::doListFilesNamesOnly(folder), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListFilesNamesOnlyWildcards(StorageIRI const& folder,
-                                                                         std::u16string pattern) const
-{
-    return guarded(ForwardingProvider::doListFilesNamesOnlyWildcards(folder, std::move(pattern)), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListFolders(StorageIRI const& folder) const
-{
-    return guarded(ForwardingProvider::doListFolders(folder), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListFoldersWildcards(StorageIRI const& folder,
-                                                                  std::u16string pattern) const
-{
-    return guarded(ForwardingProvider::doListFoldersWildcards(folder, std::move(pattern)), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListFoldersNamesOnly(StorageIRI const& folder) const
-{
-    return guarded(ForwardingProvider::doListFoldersNamesOnly(folder), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListFoldersNamesOnlyWildcards(StorageIRI const& folder,
-                                                                           std::u16string pattern) const
-{
-    return guarded(ForwardingProvider::doListFoldersNamesOnlyWildcards(folder, std::move(pattern)), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListAllRecursive(StorageIRI const& folder) const
-{
-    return guarded(ForwardingProvider::doListAllRecursive(folder), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListAllRecursiveWildcards(StorageIRI const& folder,
-                                                                       std::u16string pattern) const
-{
-    return guarded(ForwardingProvider::doListAllRecursiveWildcards(folder, std::move(pattern)), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListAllRecursiveNamesOnly(StorageIRI const& folder) const
-{
-    return guarded(ForwardingProvider::doListAllRecursiveNamesOnly(folder), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::doListAllRecursiveNamesOnlyWildcards(StorageIRI const& folder,
-                                                                                std::u16string pattern) const
-{
-    return guarded(ForwardingProvider::doListAllRecursiveNamesOnlyWildcards(folder, std::move(pattern)), folder);
-}
-
-IProvider::Listing FaultInjectingProvider::guarded(Listing listing, StorageIRI const& folder) const
-{
-    return faulty(std::move(listing), faults_, folder);
+    return faulty(ForwardingProvider::list(name, operation, folder, std::move(pattern)), faults_, folder);
 }
 
 } // namespace foundation::storage::conformance

@@ -35,33 +35,19 @@ protected:
     void before(char const* operation, provider::StorageIRI const& location) const override;
 
     provider::FileAttributes doGetFileAttributes(provider::StorageIRI const& iri) const override;
-    std::unique_ptr<provider::ByteStream> doOpenStream(provider::StorageIRI const& iri,
-                                                       provider::ByteStreamOpenOptions const& options) const override;
-    std::unique_ptr<provider::ByteStream> doOpenReadOnlyStream(provider::StorageIRI const& iri) const override;
     std::unique_ptr<provider::TransactionalStream>
     doOpenTransactionalStream(provider::StorageIRI const& iri,
                               provider::ByteStreamOpenOptions const& options) const override;
-    Listing doListAll(provider::StorageIRI const& folder) const override;
-    Listing doListAllWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
-    Listing doListAllNamesOnly(provider::StorageIRI const& folder) const override;
-    Listing doListAllNamesOnlyWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
-    Listing doListFiles(provider::StorageIRI const& folder) const override;
-    Listing doListFilesWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
-    Listing doListFilesNamesOnly(provider::StorageIRI const& folder) const override;
-    Listing doListFilesNamesOnlyWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
-    Listing doListFolders(provider::StorageIRI const& folder) const override;
-    Listing doListFoldersWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
-    Listing doListFoldersNamesOnly(provider::StorageIRI const& folder) const override;
-    Listing doListFoldersNamesOnlyWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
-    Listing doListAllRecursive(provider::StorageIRI const& folder) const override;
-    Listing doListAllRecursiveWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
-    Listing doListAllRecursiveNamesOnly(provider::StorageIRI const& folder) const override;
-    Listing doListAllRecursiveNamesOnlyWildcards(provider::StorageIRI const& folder,
-                                                 std::u16string pattern) const override;
+
+    std::unique_ptr<provider::ByteStream> handOutStream(std::unique_ptr<provider::ByteStream> stream,
+                                                        provider::StorageIRI const& file) const override;
+    std::unique_ptr<provider::TransactionalStream>
+    handOutTransaction(std::unique_ptr<provider::TransactionalStream> stream,
+                       provider::StorageIRI const& file) const override;
+    Listing list(char const* name, ListingOperation operation, provider::StorageIRI const& folder,
+                 std::u16string pattern) const override;
 
 private:
-    Listing guarded(Listing listing, provider::StorageIRI const& folder) const;
-
     std::shared_ptr<detail::FaultSource> faults_;
 };
 

@@ -10,244 +10,235 @@ ForwardingProvider::ForwardingProvider(std::shared_ptr<IProvider> target) : targ
 
 void ForwardingProvider::before(char const*, StorageIRI const&) const {}
 
+StorageIRI ForwardingProvider::translated(StorageIRI const& location) const
+{
+    return location;
+}
+
+std::unique_ptr<ByteStream> ForwardingProvider::handOutStream(std::unique_ptr<ByteStream> stream,
+                                                              StorageIRI const&) const
+{
+    return stream;
+}
+
+std::unique_ptr<TransactionalStream> ForwardingProvider::handOutTransaction(std::unique_ptr<TransactionalStream> stream,
+                                                                            StorageIRI const&) const
+{
+    return stream;
+}
+
+IProvider::Listing ForwardingProvider::list(char const* name, ListingOperation operation, StorageIRI const& folder,
+                                            std::u16string pattern) const
+{
+    return (target().*operation)(reach(name, folder), std::move(pattern));
+}
+
+StorageIRI ForwardingProvider::reach(char const* operation, StorageIRI const& location) const
+{
+    before(operation, location);
+    return translated(location);
+}
+
 void ForwardingProvider::doCreateFile(StorageIRI const& iri) const
 {
-    before("createFile", iri);
-    target_->createFile(iri);
+    target_->createFile(reach("createFile", iri));
 }
 
 void ForwardingProvider::doCreateFolder(StorageIRI const& iri) const
 {
-    before("createFolder", iri);
-    target_->createFolder(iri);
+    target_->createFolder(reach("createFolder", iri));
 }
 
 void ForwardingProvider::doCreateFolderRecursive(StorageIRI const& iri) const
 {
-    before("createFolderRecursive", iri);
-    target_->createFolderRecursive(iri);
+    target_->createFolderRecursive(reach("createFolderRecursive", iri));
 }
 
 bool ForwardingProvider::doFileExists(StorageIRI const& iri) const
 {
-    before("fileExists", iri);
-    return target_->fileExists(iri);
+    return target_->fileExists(reach("fileExists", iri));
 }
 
 bool ForwardingProvider::doFolderExists(StorageIRI const& iri) const
 {
-    before("folderExists", iri);
-    return target_->folderExists(iri);
+    return target_->folderExists(reach("folderExists", iri));
 }
 
 void ForwardingProvider::doRemoveFile(StorageIRI const& iri) const
 {
-    before("removeFile", iri);
-    target_->removeFile(iri);
+    target_->removeFile(reach("removeFile", iri));
 }
 
 void ForwardingProvider::doMoveFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
-    before("moveFile", from);
-    target_->moveFile(from, to, policy);
+    target_->moveFile(reach("moveFile", from), translated(to), policy);
 }
 
 void ForwardingProvider::doRemoveFolder(StorageIRI const& iri) const
 {
-    before("removeFolder", iri);
-    target_->removeFolder(iri);
+    target_->removeFolder(reach("removeFolder", iri));
 }
 
 void ForwardingProvider::doRemoveFolderRecursively(StorageIRI const& iri) const
 {
-    before("removeFolderRecursively", iri);
-    target_->removeFolderRecursively(iri);
+    target_->removeFolderRecursively(reach("removeFolderRecursively", iri));
 }
 
 void ForwardingProvider::doMoveFolder(StorageIRI const& from, StorageIRI const& to,
                                       ReplacementPolicy const& policy) const
 {
-    before("moveFolder", from);
-    target_->moveFolder(from, to, policy);
+    target_->moveFolder(reach("moveFolder", from), translated(to), policy);
 }
 
 FileAttributes ForwardingProvider::doGetFileAttributes(StorageIRI const& iri) const
 {
-    before("getFileAttributes", iri);
-    return target_->getFileAttributes(iri);
+    return target_->getFileAttributes(reach("getFileAttributes", iri));
 }
 
 FolderAttributes ForwardingProvider::doGetFolderAttributes(StorageIRI const& iri) const
 {
-    before("getFolderAttributes", iri);
-    return target_->getFolderAttributes(iri);
+    return target_->getFolderAttributes(reach("getFolderAttributes", iri));
 }
 
 std::unique_ptr<ByteStream> ForwardingProvider::doOpenStream(StorageIRI const& iri,
                                                              ByteStreamOpenOptions const& options) const
 {
-    before("openStream", iri);
-    return target_->openStream(iri, options);
+    return handOutStream(target_->openStream(reach("openStream", iri), options), iri);
 }
 
 std::unique_ptr<ByteStream> ForwardingProvider::doOpenReadOnlyStream(StorageIRI const& iri) const
 {
-    before("openReadOnlyStream", iri);
-    return target_->openReadOnlyStream(iri);
+    return handOutStream(target_->openReadOnlyStream(reach("openReadOnlyStream", iri)), iri);
 }
 
 std::unique_ptr<TransactionalStream>
 ForwardingProvider::doOpenTransactionalStream(StorageIRI const& iri, ByteStreamOpenOptions const& options) const
 {
-    before("openTransactionalStream", iri);
-    return target_->openTransactionalStream(iri, options);
+    return handOutTransaction(target_->openTransactionalStream(reach("openTransactionalStream", iri), options), iri);
 }
 
 IProvider::Listing ForwardingProvider::doListAll(StorageIRI const& folder) const
 {
-    before("listAll", folder);
-    return target_->listAll(folder);
+    return list("listAll", &IProvider::listAll, folder, {});
 }
 
 IProvider::Listing ForwardingProvider::doListAllWildcards(StorageIRI const& folder, std::u16string pattern) const
 {
-    before("listAll", folder);
-    return target_->listAll(folder, std::move(pattern));
+    return list("listAll", &IProvider::listAll, folder, std::move(pattern));
 }
 
 IProvider::Listing ForwardingProvider::doListAllNamesOnly(StorageIRI const& folder) const
 {
-    before("listAllNamesOnly", folder);
-    return target_->listAllNamesOnly(folder);
+    return list("listAllNamesOnly", &IProvider::listAllNamesOnly, folder, {});
 }
 
 IProvider::Listing ForwardingProvider::doListAllNamesOnlyWildcards(StorageIRI const& folder,
                                                                    std::u16string pattern) const
 {
-    before("listAllNamesOnly", folder);
-    return target_->listAllNamesOnly(folder, std::move(pattern));
+    return list("listAllNamesOnly", &IProvider::listAllNamesOnly, folder, std::move(pattern));
 }
 
 IProvider::Listing ForwardingProvider::doListFiles(StorageIRI const& folder) const
 {
-    before("listFiles", folder);
-    return target_->listFiles(folder);
+    return list("listFiles", &IProvider::listFiles, folder, {});
 }
 
 IProvider::Listing ForwardingProvider::doListFilesWildcards(StorageIRI const& folder, std::u16string pattern) const
 {
-    before("listFiles", folder);
-    return target_->listFiles(folder, std::move(pattern));
+    return list("listFiles", &IProvider::listFiles, folder, std::move(pattern));
 }
 
 IProvider::Listing ForwardingProvider::doListFilesNamesOnly(StorageIRI const& folder) const
 {
-    before("listFilesNamesOnly", folder);
-    return target_->listFilesNamesOnly(folder);
+    return list("listFilesNamesOnly", &IProvider::listFilesNamesOnly, folder, {});
 }
 
 IProvider::Listing ForwardingProvider::doListFilesNamesOnlyWildcards(StorageIRI const& folder,
                                                                      std::u16string pattern) const
 {
-    before("listFilesNamesOnly", folder);
-    return target_->listFilesNamesOnly(folder, std::move(pattern));
+    return list("listFilesNamesOnly", &IProvider::listFilesNamesOnly, folder, std::move(pattern));
 }
 
 IProvider::Listing ForwardingProvider::doListFolders(StorageIRI const& folder) const
 {
-    before("listFolders", folder);
-    return target_->listFolders(folder);
+    return list("listFolders", &IProvider::listFolders, folder, {});
 }
 
 IProvider::Listing ForwardingProvider::doListFoldersWildcards(StorageIRI const& folder, std::u16string pattern) const
 {
-    before("listFolders", folder);
-    return target_->listFolders(folder, std::move(pattern));
+    return list("listFolders", &IProvider::listFolders, folder, std::move(pattern));
 }
 
 IProvider::Listing ForwardingProvider::doListFoldersNamesOnly(StorageIRI const& folder) const
 {
-    before("listFoldersNamesOnly", folder);
-    return target_->listFoldersNamesOnly(folder);
+    return list("listFoldersNamesOnly", &IProvider::listFoldersNamesOnly, folder, {});
 }
 
 IProvider::Listing ForwardingProvider::doListFoldersNamesOnlyWildcards(StorageIRI const& folder,
                                                                        std::u16string pattern) const
 {
-    before("listFoldersNamesOnly", folder);
-    return target_->listFoldersNamesOnly(folder, std::move(pattern));
+    return list("listFoldersNamesOnly", &IProvider::listFoldersNamesOnly, folder, std::move(pattern));
 }
 
 IProvider::Listing ForwardingProvider::doListAllRecursive(StorageIRI const& folder) const
 {
-    before("listAllRecursive", folder);
-    return target_->listAllRecursive(folder);
+    return list("listAllRecursive", &IProvider::listAllRecursive, folder, {});
 }
 
 IProvider::Listing ForwardingProvider::doListAllRecursiveWildcards(StorageIRI const& folder,
                                                                    std::u16string pattern) const
 {
-    before("listAllRecursive", folder);
-    return target_->listAllRecursive(folder, std::move(pattern));
+    return list("listAllRecursive", &IProvider::listAllRecursive, folder, std::move(pattern));
 }
 
 IProvider::Listing ForwardingProvider::doListAllRecursiveNamesOnly(StorageIRI const& folder) const
 {
-    before("listAllRecursiveNamesOnly", folder);
-    return target_->listAllRecursiveNamesOnly(folder);
+    return list("listAllRecursiveNamesOnly", &IProvider::listAllRecursiveNamesOnly, folder, {});
 }
 
 IProvider::Listing ForwardingProvider::doListAllRecursiveNamesOnlyWildcards(StorageIRI const& folder,
                                                                             std::u16string pattern) const
 {
-    before("listAllRecursiveNamesOnly", folder);
-    return target_->listAllRecursiveNamesOnly(folder, std::move(pattern));
+    return list("listAllRecursiveNamesOnly", &IProvider::listAllRecursiveNamesOnly, folder, std::move(pattern));
 }
 
 void ForwardingProvider::doCopyFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
-    before("copyFile", from);
-    target_->copyFile(from, to, policy);
+    target_->copyFile(reach("copyFile", from), translated(to), policy);
 }
 
 TransactionStatus ForwardingProvider::doCopyFileAtomic(StorageIRI const& from, StorageIRI const& to,
                                                        ReplacementPolicy const& policy,
                                                        Interrupt const& interrupt) const
 {
-    before("copyFileAtomic", from);
-    return target_->copyFileAtomic(from, to, policy, interrupt);
+    return target_->copyFileAtomic(reach("copyFileAtomic", from), translated(to), policy, interrupt);
 }
 
 void ForwardingProvider::doSetLastModified(StorageIRI const& iri, boost::posix_time::ptime const& time) const
 {
-    before("setLastModified", iri);
-    target_->setLastModified(iri, time);
+    target_->setLastModified(reach("setLastModified", iri), time);
 }
 
 void ForwardingProvider::doSetWritable(StorageIRI const& iri, bool writable) const
 {
-    before("setWritable", iri);
-    target_->setWritable(iri, writable);
+    target_->setWritable(reach("setWritable", iri), writable);
 }
 
 void ForwardingProvider::doPublishFolderEventsFor(StorageIRI const& folder, ChangeEventCallback const& callback,
                                                   EventKinds const& kinds) const
 {
-    before("publishFolderEventsFor", folder);
-    target_->publishFolderEventsFor(folder, callback, kinds);
+    target_->publishFolderEventsFor(reach("publishFolderEventsFor", folder), callback, kinds);
 }
 
 void ForwardingProvider::doPublishFileEventsFor(StorageIRI const& file, ChangeEventCallback const& callback,
                                                 EventKinds const& kinds) const
 {
-    before("publishFileEventsFor", file);
-    target_->publishFileEventsFor(file, callback, kinds);
+    target_->publishFileEventsFor(reach("publishFileEventsFor", file), callback, kinds);
 }
 
 void ForwardingProvider::doStopPublishingEventsFor(StorageIRI const& folder) const
 {
-    before("stopPublishingFolderEventsFor", folder);
-    target_->stopPublishingFolderEventsFor(folder);
+    target_->stopPublishingFolderEventsFor(reach("stopPublishingFolderEventsFor", folder));
 }
 
 bool ForwardingProvider::doHasFeature(ExtendedFeature const& feature) const
@@ -257,20 +248,17 @@ bool ForwardingProvider::doHasFeature(ExtendedFeature const& feature) const
 
 PathComparator ForwardingProvider::doGetPathComparator(StorageIRI const& iri) const
 {
-    before("getPathComparator", iri);
-    return target_->getPathComparator(iri);
+    return target_->getPathComparator(reach("getPathComparator", iri));
 }
 
 StorageIRI ForwardingProvider::doGetCanonicalLocation(StorageIRI const& iri) const
 {
-    before("getCanonicalLocation", iri);
-    return target_->getCanonicalLocation(iri);
+    return target_->getCanonicalLocation(reach("getCanonicalLocation", iri));
 }
 
 FilenameSensitivity ForwardingProvider::doGetFilenameSensitivity(StorageIRI const& iri) const
 {
-    before("getFilenameSensitivity", iri);
-    return target_->getFilenameSensitivity(iri);
+    return target_->getFilenameSensitivity(reach("getFilenameSensitivity", iri));
 }
 
 void ForwardingProvider::doShutdown()
@@ -280,20 +268,17 @@ void ForwardingProvider::doShutdown()
 
 ExistenceType ForwardingProvider::doExists(StorageIRI const& iri) const
 {
-    before("exists", iri);
-    return target_->exists(iri);
+    return target_->exists(reach("exists", iri));
 }
 
 ExistenceTypeExtended ForwardingProvider::doExistsExtended(StorageIRI const& iri) const
 {
-    before("existsExtended", iri);
-    return target_->existsExtended(iri);
+    return target_->existsExtended(reach("existsExtended", iri));
 }
 
 ExtendedAttributes ForwardingProvider::doGetExtendedAttributes(StorageIRI const& iri) const
 {
-    before("getExtendedAttributes", iri);
-    return target_->getExtendedAttributes(iri);
+    return target_->getExtendedAttributes(reach("getExtendedAttributes", iri));
 }
 
 } // namespace foundation::storage::conformance

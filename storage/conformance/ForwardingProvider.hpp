@@ -26,6 +26,23 @@ protected:
     /// the operation throws.
     virtual void before(char const* operation, provider::StorageIRI const& location) const;
 
+    /// The location of the other provider that a location stands for: as it stands, the same. Failures and canonical
+    /// locations are not translated back.
+    virtual provider::StorageIRI translated(provider::StorageIRI const& location) const;
+
+    /// What a caller gets for a stream of the other provider: as it stands, that itself. The location is the one that
+    /// the caller asked for.
+    virtual std::unique_ptr<provider::ByteStream> handOutStream(std::unique_ptr<provider::ByteStream> stream,
+                                                                provider::StorageIRI const& file) const;
+    virtual std::unique_ptr<provider::TransactionalStream>
+    handOutTransaction(std::unique_ptr<provider::TransactionalStream> stream, provider::StorageIRI const& file) const;
+
+    using ListingOperation = Listing (provider::IProvider::*)(provider::StorageIRI const&, std::u16string) const;
+
+    /// All sixteen listing operations end here: `operation` of the other provider, whose public name is `name`.
+    virtual Listing list(char const* name, ListingOperation operation, provider::StorageIRI const& folder,
+                         std::u16string pattern) const;
+
     void doCreateFile(provider::StorageIRI const& iri) const override;
     void doCreateFolder(provider::StorageIRI const& iri) const override;
     void doCreateFolderRecursive(provider::StorageIRI const& iri) const override;
@@ -85,6 +102,8 @@ protected:
     provider::ExtendedAttributes doGetExtendedAttributes(provider::StorageIRI const& iri) const override;
 
 private:
+    provider::StorageIRI reach(char const* operation, provider::StorageIRI const& location) const;
+
     std::shared_ptr<provider::IProvider> target_;
 };
 

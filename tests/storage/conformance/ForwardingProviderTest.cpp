@@ -132,6 +132,67 @@ TEST(ForwardingProvider, AnnouncesAnOperationByNameAndFirstLocation)
               (std::vector<std::pair<std::string, StorageIRI>>{{"moveFile", iri}, {"listFilesNamesOnly", other}}));
 }
 
+class Elsewhere : public ForwardingProvider
+{
+public:
+    using ForwardingProvider::ForwardingProvider;
+
+protected:
+    StorageIRI translated(StorageIRI const& location) const override { return StorageIRI(location, u"inner"); }
+};
+
+TEST(ForwardingProvider, TranslatesEveryLocation)
+{
+    CallLog translated;
+    Elsewhere const elsewhere(std::make_shared<RecordingProvider>(translated));
+    elsewhere.removeFile(iri);
+    elsewhere.moveFile(iri, other, {});
+    CallLog expected;
+    RecordingProvider const recording(expected);
+    recording.removeFile(StorageIRI(iri, u"inner"));
+    recording.moveFile(StorageIRI(iri, u"inner"), StorageIRI(other, u"inner"), {});
+    EXPECT_EQ(translated, expected);
+}
+
+class Withholding : public ForwardingProvider
+{
+public:
+    using ForwardingProvider::ForwardingProvider;
+    mutable std::vector<StorageIRI> withheld;
+
+protected:
+    std::unique_ptr<ByteStream> handOutStream(std::unique_ptr<ByteStream>, StorageIRI const& file) const override
+    {
+        withheld.push_back(file);
+        throw std::runtime_error("withheld");
+    }
+
+    std::unique_ptr<TransactionalStream> handOutTransaction(std::unique_ptr<TransactionalStream>,
+                                                            StorageIRI const& file) const override
+    {
+        withheld.push_back(file);
+        return nullptr;
+    }
+
+    Listing list(char const*, ListingOperation, StorageIRI const& folder, std::u16string) const override
+    {
+        withheld.push_back(folder);
+        return nullptr;
+    }
+};
+
+TEST(ForwardingProvider, LetsADerivedClassHandOutOtherStreamsAndListings)
+{
+    CallLog log;
+    Withholding const withholding(std::make_shared<RecordingProvider>(log, RecordingProvider::Untold::AnswersPlainly));
+    EXPECT_THROW(withholding.openStream(iri, {}), std::runtime_error);
+    EXPECT_THROW(withholding.openReadOnlyStream(other), std::runtime_error);
+    EXPECT_EQ(withholding.openTransactionalStream(iri, {}), nullptr);
+    EXPECT_EQ(withholding.listAll(iri), nullptr);
+    EXPECT_EQ(withholding.listFilesNamesOnly(other, u"*"), nullptr);
+    EXPECT_EQ(withholding.withheld, (std::vector<StorageIRI>{iri, other, iri, iri, other}));
+}
+
 TEST(ForwardingProvider, PassesTheFailuresOfItsTarget)
 {
     CallLog log;
