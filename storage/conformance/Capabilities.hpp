@@ -2,6 +2,7 @@
 
 #include <boost/date_time/posix_time/posix_time_types.hpp>
 
+#include <chrono>
 #include <cstddef>
 #include <optional>
 #include <set>
@@ -49,6 +50,9 @@ struct Capabilities
 
     bool fileEvents = false;
     bool folderEvents = false;
+
+    /// How long after a change its event may come. A check that succeeds waits no longer than the event does.
+    std::chrono::milliseconds longestEventDelay = std::chrono::seconds(10);
 
     /// Those that every file has.
     std::set<std::string> extendedAttributes = {};

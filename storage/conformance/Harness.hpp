@@ -38,8 +38,8 @@ struct Makers
 /// All that the kit needs to know of a provider.
 struct Harness
 {
-    /// Makes a new place that holds nothing.
-    std::function<Place()> makePlace;
+    /// Makes a new place that holds nothing; not needed of a provider that is read-only.
+    std::function<Place()> makePlace = {};
 
     Capabilities capabilities = {};
     Makers makers = {};

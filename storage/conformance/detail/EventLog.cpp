@@ -1,18 +1,12 @@
 #include <storage/conformance/detail/EventLog.hpp>
 
 #include <algorithm>
-#include <chrono>
 
 namespace foundation::storage::conformance::detail {
 
 using provider::StorageIRI;
 
-namespace {
-
-/// Long enough for a busy machine; a check that succeeds never waits so long.
-constexpr std::chrono::seconds patience(10);
-
-} // namespace
+EventLog::EventLog(Harness const& harness) : patience_(harness.capabilities.longestEventDelay) {}
 
 provider::ChangeEventCallback EventLog::callback()
 {
@@ -27,7 +21,7 @@ provider::ChangeEventCallback EventLog::callback()
 bool EventLog::waitFor(events::Kind kind, StorageIRI const& location)
 {
     std::unique_lock lock(mutex_);
-    return arrival_.wait_for(lock, patience, [&] {
+    return arrival_.wait_for(lock, patience_, [&] {
         return std::any_of(events_.begin(), events_.end(),
                            [&](Event const& event) { return event.kind == kind && event.location == location; });
     });

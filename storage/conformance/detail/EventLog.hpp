@@ -1,7 +1,9 @@
 #pragma once
 
+#include <storage/conformance/Harness.hpp>
 #include <storage/provider/IProvider.hpp>
 
+#include <chrono>
 #include <condition_variable>
 #include <mutex>
 #include <vector>
@@ -22,6 +24,8 @@ struct Event
 class EventLog
 {
 public:
+    explicit EventLog(Harness const& harness);
+
     provider::ChangeEventCallback callback();
 
     /// Waits until an event of this kind at this location has come; answers false when that takes too long.
@@ -31,6 +35,7 @@ public:
     std::vector<Event> events() const;
 
 private:
+    std::chrono::milliseconds const patience_;
     mutable std::mutex mutex_;
     std::condition_variable arrival_;
     std::vector<Event> events_;

@@ -18,8 +18,13 @@ namespace {
 constexpr ByteStreamOpenOptions replaceContent{ByteStreamAccess::WriteOnly, ByteStreamCreate::Create,
                                                ByteStreamTruncate::TruncateExisting, ByteStreamAppend::Overwrite};
 
+/// Far more than any check makes; a provider that lists a folder in itself goes beyond every limit.
+constexpr std::size_t deepest = 30;
+
 void addTo(Tree& tree, StorageItem const& folder, std::u16string const& prefix)
 {
+    if (static_cast<std::size_t>(std::count(prefix.begin(), prefix.end(), u'/')) > deepest)
+        throw std::runtime_error("folders are listed in each other without end");
     IProvider::Listing const listing = folder.listAll();
     for (FolderEntry const& entry : entries(*listing)) {
         StorageItem const item(folder, entry.getName());

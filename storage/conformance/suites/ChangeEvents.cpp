@@ -32,7 +32,7 @@ void expectTypes(EventLog const& log, StorageIRI const& location, EntryType type
 
 void aFolderTellsWhatIsCreatedInIt(Harness const& harness)
 {
-    EventLog log;
+    EventLog log(harness);
     Scene const scene(harness);
     scene.provider().publishFolderEventsFor(scene.iri(), log.callback(), allKinds);
     scene.provider().createFile(scene.iri(u"file"));
@@ -46,29 +46,32 @@ void aFolderTellsWhatIsCreatedInIt(Harness const& harness)
 
 void aFolderTellsWhatIsRemovedFromIt(Harness const& harness)
 {
-    EventLog log;
+    EventLog log(harness);
     Scene const scene(harness, {{u"file", "content"}, {u"folder/", ""}});
     scene.provider().publishFolderEventsFor(scene.iri(), log.callback(), allKinds);
     scene.provider().removeFile(scene.iri(u"file"));
     scene.provider().removeFolder(scene.iri(u"folder"));
     EXPECT_TRUE(log.waitFor(Kind::Removed, scene.iri(u"file")));
     EXPECT_TRUE(log.waitFor(Kind::Removed, scene.iri(u"folder")));
+    expectTypes(log, scene.iri(u"file"), EntryType::File);
+    expectTypes(log, scene.iri(u"folder"), EntryType::Folder);
     scene.provider().stopPublishingFolderEventsFor(scene.iri());
 }
 
 void aFolderTellsWhatIsModifiedInIt(Harness const& harness)
 {
-    EventLog log;
+    EventLog log(harness);
     Scene const scene(harness, {{u"file", "content"}});
     scene.provider().publishFolderEventsFor(scene.iri(), log.callback(), allKinds);
     scene.write(u"file", "more content");
     EXPECT_TRUE(log.waitFor(Kind::Modified, scene.iri(u"file")));
+    expectTypes(log, scene.iri(u"file"), EntryType::File);
     scene.provider().stopPublishingFolderEventsFor(scene.iri());
 }
 
 void aMoveTellsBothLocations(Harness const& harness)
 {
-    EventLog log;
+    EventLog log(harness);
     Scene const scene(harness, {{u"from", "content"}});
     scene.provider().publishFolderEventsFor(scene.iri(), log.callback(), allKinds);
     scene.provider().moveFile(scene.iri(u"from"), scene.iri(u"to"), ReplacementPolicy::Preserve);
@@ -80,7 +83,7 @@ void aMoveTellsBothLocations(Harness const& harness)
 
 void onlyTheKindsAskedForAreTold(Harness const& harness)
 {
-    EventLog log;
+    EventLog log(harness);
     Scene const scene(harness);
     scene.provider().publishFolderEventsFor(scene.iri(), log.callback(), {Kind::Removed});
     scene.write(u"file", "content");
@@ -94,7 +97,7 @@ void onlyTheKindsAskedForAreTold(Harness const& harness)
 /// Events of another folder show that those of the first would have come by now.
 void nothingIsToldAfterStopping(Harness const& harness)
 {
-    EventLog log;
+    EventLog log(harness);
     Scene const scene(harness, {{u"stopped/", ""}, {u"going on/", ""}});
     scene.provider().publishFolderEventsFor(scene.iri(u"stopped"), log.callback(), allKinds);
     scene.provider().publishFolderEventsFor(scene.iri(u"going on"), log.callback(), allKinds);
@@ -109,7 +112,7 @@ void nothingIsToldAfterStopping(Harness const& harness)
 
 void aCallbackMayStopItsOwnEvents(Harness const& harness)
 {
-    EventLog log;
+    EventLog log(harness);
     Scene const scene(harness);
     ChangeEventCallback const logged = log.callback();
     auto const stopping = [&](auto&&... event) {
@@ -123,7 +126,7 @@ void aCallbackMayStopItsOwnEvents(Harness const& harness)
 
 void aFileTellsItsOwnChangesAlone(Harness const& harness)
 {
-    EventLog log;
+    EventLog log(harness);
     Scene const scene(harness, {{u"file", "content"}, {u"other", "content"}});
     scene.provider().publishFileEventsFor(scene.iri(u"file"), log.callback(), {Kind::Modified});
     scene.write(u"other", "more content");
@@ -149,7 +152,7 @@ void expectNotSupported(Scene const& scene, Action const& action, StorageIRI con
 
 void folderEventsAreRefused(Harness const& harness)
 {
-    EventLog log;
+    EventLog log(harness);
     Scene const scene(harness, {{u"folder/", ""}});
     for (StorageIRI const& folder : {scene.iri(), scene.iri(u"folder")}) {
         expectNotSupported(
@@ -161,7 +164,7 @@ void folderEventsAreRefused(Harness const& harness)
 
 void fileEventsAreRefused(Harness const& harness)
 {
-    EventLog log;
+    EventLog log(harness);
     Scene const scene(harness, {{u"file", "content"}});
     StorageIRI const file = scene.iri(u"file");
     expectNotSupported(

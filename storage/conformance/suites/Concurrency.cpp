@@ -8,6 +8,9 @@
 #include <storage/provider/StreamClosePolicy.hpp>
 
 #include <algorithm>
+#include <atomic>
+#include <functional>
+#include <thread>
 #include <vector>
 
 namespace foundation::storage::conformance::detail {
@@ -126,20 +129,38 @@ void foldersWithTheirAncestorsAreMadeTogether(Harness const& harness)
     }
 }
 
+/// Every fourth thread does its rounds of `change`; meanwhile all others look, for as long as anything changes.
+void whileSomeChange(std::function<void(int thread, int round)> const& change, std::function<void()> const& look)
+{
+    std::atomic<int> changing = threadCount / 4;
+    onThreads([&](int thread) {
+        if (thread % 4 != 0) {
+            do {
+                look();
+                std::this_thread::yield();
+            } while (changing > 0);
+            return;
+        }
+        struct Leaving
+        {
+            ~Leaving() { --count; }
+            std::atomic<int>& count;
+        } const leaving{changing};
+        for (int round = 0; round < rounds; ++round)
+            change(thread, round);
+    });
+}
+
 void readersSeeOneCommitOrAnother(Harness const& harness)
 {
     Scene const scene(harness, {{u"file", ownContent(0)}});
-    onThreads([&](int thread) {
-        for (int round = 0; round < rounds; ++round) {
-            if (thread % 4 != 0) {
-                requireThat(isSomeonesContent(scene.read(u"file")), "content is whole");
-                continue;
-            }
+    whileSomeChange(
+        [&](int thread, int round) {
             auto const transaction = scene.provider().openTransactionalStream(scene.iri(u"file"), {});
             writeAll(*transaction->byteStream(), ownContent(thread));
             transaction->close(round % 4 == 3 ? StreamClosePolicy::Abort : StreamClosePolicy::Commit);
-        }
-    });
+        },
+        [&] { requireThat(isSomeonesContent(scene.read(u"file")), "content is whole"); });
     EXPECT_TRUE(isSomeonesContent(scene.read(u"file")));
     EXPECT_EQ(scene.tree().size(), 1u);
 }
@@ -147,16 +168,12 @@ void readersSeeOneCommitOrAnother(Harness const& harness)
 void theFileIsNeverMissingWhileItIsReplaced(Harness const& harness)
 {
     Scene const scene(harness, {{u"file", ownContent(0)}});
-    onThreads([&](int thread) {
-        for (int round = 0; round < rounds; ++round) {
-            if (thread % 4 != 0) {
-                requireThat(scene.provider().fileExists(scene.iri(u"file")), "the file is there");
-                continue;
-            }
+    whileSomeChange(
+        [&](int thread, int) {
             scene.write(ownName(thread), ownContent(thread));
             scene.provider().moveFile(scene.iri(ownName(thread)), scene.iri(u"file"), ReplacementPolicy::Overwrite);
-        }
-    });
+        },
+        [&] { requireThat(scene.provider().fileExists(scene.iri(u"file")), "the file is there"); });
     EXPECT_TRUE(isSomeonesContent(scene.read(u"file")));
     EXPECT_EQ(scene.tree().size(), 1u);
 }
@@ -164,17 +181,15 @@ void theFileIsNeverMissingWhileItIsReplaced(Harness const& harness)
 void listingsGoOnWhileTheFolderChanges(Harness const& harness)
 {
     Scene const scene(harness, {{u"always", "content"}});
-    onThreads([&](int thread) {
-        for (int round = 0; round < rounds; ++round) {
-            if (thread % 2 == 0) {
-                scene.write(ownName(thread), "content");
-                scene.provider().removeFile(scene.iri(ownName(thread)));
-                continue;
-            }
+    whileSomeChange(
+        [&](int thread, int) {
+            scene.write(ownName(thread), "content");
+            scene.provider().removeFile(scene.iri(ownName(thread)));
+        },
+        [&] {
             Names const names = namesOf(scene.provider().listAll(scene.iri()));
             requireThat(std::count(names.begin(), names.end(), u"always") == 1, "what stays is listed once");
-        }
-    });
+        });
     EXPECT_TRUE(scene.holds({{u"always", "content"}}));
 }
 
@@ -230,6 +245,26 @@ void copiesDoNotMix(Harness const& harness)
     EXPECT_EQ(scene.tree().size(), 2 * sources.size());
 }
 
+void readersSeeOneAtomicCopyOrAnother(Harness const& harness)
+{
+    Tree sources{{u"file", ownContent(0)}};
+    for (int thread = 0; thread < threadCount; ++thread)
+        sources[ownName(thread)] = ownContent(thread);
+    Scene const scene(harness, sources);
+    whileSomeChange(
+        [&](int thread, int) {
+            scene.provider().copyFileAtomic(scene.iri(ownName(thread)), scene.iri(u"file"),
+                                            ReplacementPolicy::Overwrite, {});
+        },
+        [&] { requireThat(isSomeonesContent(scene.read(u"file")), "content is whole"); });
+    EXPECT_EQ(scene.tree().size(), sources.size());
+}
+
+bool copiesAtomicallyForThreads(Harness const& harness)
+{
+    return harness.capabilities.atomicCopy && servesThreads(harness);
+}
+
 } // namespace
 
 std::vector<Check> concurrencyChecks()
@@ -249,6 +284,7 @@ std::vector<Check> concurrencyChecks()
                          CHECK_FUNCTION(appendedBlocksAreNotTornOrLost),
                          CHECK_FUNCTION(copiesDoNotMix),
                      })
+        .forWritable(copiesAtomicallyForThreads, {CHECK_FUNCTION(readersSeeOneAtomicCopyOrAnother)})
         .checks();
 }
 

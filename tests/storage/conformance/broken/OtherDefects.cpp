@@ -1,0 +1,264 @@
+// What can be wrong with change events, with use by many threads, and with refusing to write.
+
+#include <storage/provider/ChangeEventExceptions.hpp>
+#include <storage/provider/StreamClosePolicy.hpp>
+#include <tests/storage/conformance/broken/Defect.hpp>
+
+#include <atomic>
+#include <thread>
+#include <utility>
+
+namespace foundation::storage::conformance::broken {
+
+namespace {
+
+using events::EntryType;
+using events::Kind;
+using Options = ByteStreamOpenOptions;
+
+/// Tells files as folders and folders as files.
+void swappingTypes(Store s, Iri i, ChangeEventCallback const& callback, Kinds kinds)
+{
+    s.publishFolderEventsFor(
+        i,
+        [callback](Kind const& kind, Iri location, Iri second, EntryType const& type, auto const& details) {
+            callback(kind, location, second, type == EntryType::File ? EntryType::Folder : EntryType::File, details);
+        },
+        kinds);
+}
+
+/// Tells a move as if it had gone nowhere.
+void withoutSecondLocation(Store s, Iri i, ChangeEventCallback const& callback, Kinds kinds)
+{
+    s.publishFolderEventsFor(
+        i,
+        [callback](Kind const& kind, Iri location, Iri, EntryType const& type, auto const& details) {
+            callback(kind, location, location, type, details);
+        },
+        kinds);
+}
+
+void ofAllKinds(Store s, Iri i, ChangeEventCallback const& callback, Kinds)
+{
+    s.publishFolderEventsFor(i, callback,
+                             {Kind::Created, Kind::Removed, Kind::Modified, Kind::AttributesChanged, Kind::Moved});
+}
+
+void ofTheWholeFolder(Store s, Iri i, ChangeEventCallback const& callback, Kinds kinds)
+{
+    s.publishFolderEventsFor(i.getParent(), callback, kinds);
+}
+
+/// Fails to stop events from inside their callback, which is where all these are stopped.
+void refusingToStop(Store, Iri i)
+{
+    throw Exception(ErrorCode::ResourceInUse, i);
+}
+
+Table changeEvents()
+{
+    return {"ChangeEvents",
+            {{"AFolderTellsWhatIsCreatedInIt", "SwapsTypes", {.publishFolderEventsFor = swappingTypes}},
+             {"AFolderTellsWhatIsRemovedFromIt", "SwapsTypes", {.publishFolderEventsFor = swappingTypes}},
+             {"AFolderTellsWhatIsModifiedInIt", "SwapsTypes", {.publishFolderEventsFor = swappingTypes}},
+             {.check = "AFolderTellsWhatIsModifiedInIt",
+              .name = "TellsNothing",
+              .misbehaviour = {.publishFolderEventsFor = [](Store, Iri, ChangeEventCallback const&, Kinds) {}},
+              .claim = [](Capabilities& c) { c.longestEventDelay = std::chrono::milliseconds(1); }},
+             {"AMoveTellsBothLocations", "TellsOne", {.publishFolderEventsFor = withoutSecondLocation}},
+             {"OnlyTheKindsAskedForAreTold", "TellsAllKinds", {.publishFolderEventsFor = ofAllKinds}},
+             {"NothingIsToldAfterStopping", "DoesNotStop", {.stopPublishingEventsFor = [](Store, Iri) {}}},
+             {.check = "ACallbackMayStopItsOwnEvents",
+              .name = "RefusesToStop",
+              .misbehaviour = {.stopPublishingEventsFor = refusingToStop},
+              .claim = [](Capabilities& c) { c.longestEventDelay = std::chrono::milliseconds(1); }},
+             {"AFileTellsItsOwnChangesAlone", "TellsThoseOfTheFolder", {.publishFileEventsFor = ofTheWholeFolder}},
+             {"FolderEventsAreRefused",
+              "TakesTheCallbackAndForgetsIt",
+              {.publishFolderEventsFor = [](Store, Iri, ChangeEventCallback const&, Kinds) {}},
+              plainHarness},
+             {"FolderEventsAreRefused",
+              "NamesTheParent",
+              {.publishFolderEventsFor = [](Store, Iri i, ChangeEventCallback const&,
+                                            Kinds) { throw ChangeEventsNotSupportedException(i.getParent()); }},
+              plainHarness},
+             {"FileEventsAreRefused",
+              "TakesTheCallbackAndForgetsIt",
+              {.publishFileEventsFor = [](Store, Iri, ChangeEventCallback const&, Kinds) {}},
+              plainHarness}}};
+}
+
+/// Serves the thread that made it alone.
+class OfOneThread final : public ForwardingProvider
+{
+public:
+    using ForwardingProvider::ForwardingProvider;
+
+protected:
+    void before(char const*, Iri location) const override
+    {
+        if (std::this_thread::get_id() != owner_)
+            throw Exception(ErrorCode::InternalError, location);
+    }
+
+private:
+    std::thread::id const owner_ = std::this_thread::get_id();
+};
+
+/// Loses sight of a file for a moment after it was replaced.
+class LosesSight final : public ForwardingProvider
+{
+public:
+    using ForwardingProvider::ForwardingProvider;
+
+protected:
+    void doMoveFile(Iri from, Iri to, Policy const& policy) const override
+    {
+        ForwardingProvider::doMoveFile(from, to, policy);
+        lost_ = true;
+    }
+
+    bool doFileExists(Iri iri) const override
+    {
+        return !lost_.exchange(false) && ForwardingProvider::doFileExists(iri);
+    }
+
+private:
+    mutable std::atomic<bool> lost_ = false;
+};
+
+template <typename Provider>
+std::shared_ptr<IProvider> wrappedIn(std::shared_ptr<IProvider> sound)
+{
+    return std::make_shared<Provider>(std::move(sound));
+}
+
+long withoutTheLastByte(ByteStream& stream, char const* data, long count)
+{
+    return stream.write(data, count - 1) + 1;
+}
+
+Transaction addingAByte(Store s, Iri i, Options o)
+{
+    class AddingAByte final : public TransactionalStream
+    {
+    public:
+        explicit AddingAByte(Transaction sound) : sound_(std::move(sound)) {}
+
+    protected:
+        ByteStream* doByteStream() override { return sound_->byteStream(); }
+        void doClose(StreamClosePolicy const& policy) override
+        {
+            sound_->write("?", 1);
+            sound_->close(policy);
+        }
+
+    private:
+        Transaction sound_;
+    };
+    return std::make_unique<AddingAByte>(s.openTransactionalStream(i, o));
+}
+
+Listing withoutTheFirst(ListingCall const& call)
+{
+    Listing listing = call.answer();
+    if (listing->hasEntry())
+        listing->next();
+    return listing;
+}
+
+Table concurrency()
+{
+    return {
+        "Concurrency",
+        {{.check = "ThreadsReadOneFile", .name = "ServesOneThread", .wrap = wrappedIn<OfOneThread>},
+         {.check = "ThreadsDoNotDisturbEachOther", .name = "ServesOneThread", .wrap = wrappedIn<OfOneThread>},
+         {"OneThreadCreatesAName",
+          "LetsAllCreateIt",
+          {.createFile = [](Store s, Iri i) { swallowed([&] { s.createFile(i); }); }}},
+         {"OneThreadCreatesAName",
+          "SaysResourceInUse",
+          {.createFolder = [](Store s, Iri i) { miscoded([&] { s.createFolder(i); }, ErrorCode::ResourceInUse); }}},
+         {"OneThreadRemovesAName",
+          "LetsAllRemoveIt",
+          {.removeFile = [](Store s, Iri i) { swallowed([&] { s.removeFile(i); }); }}},
+         {"OneThreadMovesToAName",
+          "LetsAllReplaceIt",
+          {.moveFile = [](Store s, Iri from, Iri to, Policy) { s.moveFile(from, to, Policy::Overwrite); }}},
+         {"FoldersWithTheirAncestorsAreMadeTogether",
+          "SaysResourceInUse",
+          {.createFolderRecursive =
+               [](Store s, Iri i) { miscoded([&] { s.createFolderRecursive(i); }, ErrorCode::ResourceInUse); }}},
+         {"ReadersSeeOneCommitOrAnother", "CommitsAByteMore", {.openTransactionalStream = addingAByte}},
+         {.check = "TheFileIsNeverMissingWhileItIsReplaced", .name = "LosesSightOfIt", .wrap = wrappedIn<LosesSight>},
+         {"ListingsGoOnWhileTheFolderChanges", "DropsTheFirst", {.list = withoutTheFirst}},
+         {"AppendedBlocksAreNotTornOrLost", "LosesTheLastByte", {.write = withoutTheLastByte}},
+         {"CopiesDoNotMix",
+          "CopiesTheFirstBytes",
+          {.copyFile = [](Store s, Iri from, Iri to, Policy) { copyInPlace(s, from, to, 1000); }}},
+         {"ReadersSeeOneAtomicCopyOrAnother",
+          "CopiesTheFirstBytes",
+          {.copyFileAtomic = [](Store s, Iri from, Iri to, Policy, IProvider::Interrupt const&) {
+              copyInPlace(s, from, to, 1000);
+              return TransactionStatus::Completed;
+          }}}}};
+}
+
+void refusingOtherwise(Store s, Iri i)
+{
+    miscoded([&] { s.createFolder(i); }, ErrorCode::PermissionDenied);
+}
+
+Table readOnly()
+{
+    return {
+        "ReadOnly",
+        {{"CreatingIsRefused", "SaysPermissionDenied", {.createFolder = refusingOtherwise}, readOnlyHarness},
+         {"CreatingIsRefused",
+          "LooksFirst",
+          {.createFile =
+               [](Store s, Iri i) {
+                   if (s.exists(i) != ExistenceType::AsNeither)
+                       throw Exception(ErrorCode::ResourceAlreadyExists, i);
+                   s.createFile(i);
+               }},
+          readOnlyHarness},
+         {"RemovingIsRefused", "SaysNothing", {.removeFolderRecursively = [](Store, Iri) {}}, readOnlyHarness},
+         {"OpeningForWritingIsRefused",
+          "OpensWhatItWillNotTruncate",
+          {.openStream =
+               [](Store s, Iri i, Options o) {
+                   return o.truncate == ByteStreamTruncate::PreserveExisting && s.fileExists(i)
+                              ? s.openReadOnlyStream(i)
+                              : s.openStream(i, o);
+               }},
+          readOnlyHarness},
+         {"SettingAttributesIsRefused",
+          "LetsWritabilityBeTaken",
+          {.setWritable =
+               [](Store s, Iri i, bool writable) {
+                   if (writable)
+                       s.setWritable(i, writable);
+               }},
+          readOnlyHarness},
+         {"MovingAndCopyingNameTheSource",
+          "NamesTheTarget",
+          {.copyFile = [](Store s, Iri from, Iri to, Policy p) { misplaced([&] { s.copyFile(from, to, p); }, to); }},
+          readOnlyHarness},
+         {"TransactionsAreRefused",
+          "SaysUnsupportedOperation",
+          {.openTransactionalStream =
+               [](Store s, Iri i, Options o) {
+                   return miscoded([&] { return s.openTransactionalStream(i, o); }, ErrorCode::UnsupportedOperation);
+               }},
+          readOnlyHarness}}};
+}
+
+} // namespace
+
+std::vector<Table> otherDefects()
+{
+    return {changeEvents(), concurrency(), readOnly()};
+}
+
+} // namespace foundation::storage::conformance::broken
