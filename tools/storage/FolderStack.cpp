@@ -13,11 +13,26 @@ constexpr std::ptrdiff_t maximumOpenListings = 100;
 
 } // namespace
 
-FolderLevel::FolderLevel(Place folder, std::optional<Place> counterpart)
-    : folder_(std::move(folder)),
-      counterpart_(std::move(counterpart)),
-      listing_(at(folder_, [&] { return folder_.item().listAllNamesOnly(); }))
+ListedName::ListedName(provider::FolderEntry const& entry) : name(entry.getName()), isFile(entry.isFile())
+{
+    if (auto const& file = entry.getFileAttributes()) {
+        size = file->getSize();
+        modified = file->getLastModified();
+    } else if (auto const& folder = entry.getFolderAttributes()) {
+        modified = folder->getLastModified();
+    }
+}
+
+FolderLevel::FolderLevel(Place folder, std::optional<Place> counterpart, Listing kind)
+    : folder_(std::move(folder)), counterpart_(std::move(counterpart)), kind_(kind), listing_(list())
 {}
+
+std::unique_ptr<provider::IFolderEntryIterator> FolderLevel::list() const
+{
+    return at(folder_, [&] {
+        return kind_ == Listing::NamesOnly ? folder_.item().listAllNamesOnly() : folder_.item().listAll();
+    });
+}
 
 bool FolderLevel::hasNext()
 {
@@ -35,8 +50,7 @@ ListedName FolderLevel::next()
         return entry;
     }
     isEntryTaken_ = true;
-    provider::FolderEntry const& entry = listing_->entry();
-    return {entry.getName(), entry.isFile()};
+    return ListedName(listing_->entry());
 }
 
 /// A listing that fails is through: the walk goes on elsewhere.
@@ -72,7 +86,7 @@ void FolderLevel::restart()
 {
     close();
     hasChanged = false;
-    listing_ = at(folder_, [&] { return folder_.item().listAllNamesOnly(); });
+    listing_ = list();
 }
 
 void FolderLevel::close() noexcept
@@ -86,7 +100,7 @@ void FolderStack::enter(Place folder, std::optional<Place> counterpart)
     auto const isOpen = [](FolderLevel const& level) { return level.holdsListing(); };
     if (std::count_if(levels_.begin(), levels_.end(), isOpen) >= maximumOpenListings)
         std::find_if(levels_.begin(), levels_.end(), isOpen)->release();
-    levels_.emplace_back(std::move(folder), std::move(counterpart));
+    levels_.emplace_back(std::move(folder), std::move(counterpart), kind_);
 }
 
 } // namespace foundation::storage::tool

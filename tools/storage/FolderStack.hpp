@@ -1,10 +1,12 @@
 #pragma once
 
+#include <boost/date_time/posix_time/posix_time_types.hpp>
 #include <storage/provider/IFolderEntryIterator.hpp>
 #include <tools/storage/Failure.hpp>
 #include <tools/storage/Place.hpp>
 
 #include <cstddef>
+#include <cstdint>
 #include <deque>
 #include <memory>
 #include <optional>
@@ -12,11 +14,21 @@
 
 namespace foundation::storage::tool {
 
-/// What a listing says of an entry without asking for attributes.
+/// What a listing says of an entry; size and time are empty where it was not asked for attributes.
 struct ListedName
 {
+    explicit ListedName(provider::FolderEntry const& entry);
+
     std::u16string name;
     bool isFile;
+    std::optional<std::uint64_t> size;
+    std::optional<boost::posix_time::ptime> modified;
+};
+
+enum class Listing
+{
+    NamesOnly,
+    WithAttributes,
 };
 
 /// One folder of a walk: its listing, and what the walk notes about it.
@@ -24,7 +36,7 @@ class FolderLevel
 {
 public:
     /// Opens the listing; failures name the folder.
-    FolderLevel(Place folder, std::optional<Place> counterpart);
+    FolderLevel(Place folder, std::optional<Place> counterpart, Listing kind);
 
     Place const& folder() const { return folder_; }
 
@@ -49,11 +61,13 @@ public:
     bool hasChanged = false; ///< something in this folder was removed since the listing started
 
 private:
+    std::unique_ptr<provider::IFolderEntryIterator> list() const;
     void advance();
     void close() noexcept;
 
     Place folder_;
     std::optional<Place> counterpart_;
+    Listing kind_;
     std::unique_ptr<provider::IFolderEntryIterator> listing_;
     std::deque<ListedName> rest_;
     std::optional<Failure> failure_;
@@ -67,6 +81,8 @@ private:
 class FolderStack
 {
 public:
+    explicit FolderStack(Listing kind = Listing::NamesOnly) : kind_(kind) {}
+
     bool empty() const { return levels_.empty(); }
     std::size_t depth() const { return levels_.size(); }
     FolderLevel& innermost() { return levels_.back(); }
@@ -75,6 +91,7 @@ public:
     void leave() { levels_.pop_back(); }
 
 private:
+    Listing kind_;
     std::deque<FolderLevel> levels_;
 };
 

@@ -4,27 +4,54 @@
 #include <CLI/Config.hpp>
 #include <CLI/Formatter.hpp>
 #include <algorithm>
+#include <charconv>
+#include <stdexcept>
+#include <string_view>
+#include <system_error>
 
 namespace foundation::storage::tool {
 
 namespace {
 
 constexpr char mark = '\1';
+constexpr std::string_view anyText = "TEXT:"; ///< what the parser puts before the choices
 constexpr int unlimited = CLI::detail::expected_max_vector_size;
+
+/// Where an operand or value begins in an argument; npos where there is none. A value that is an argument by itself
+/// looks like an operand.
+std::size_t placeOfMark(std::string_view argument, bool isOperand)
+{
+    if (isOperand || !argument.starts_with('-'))
+        return 0;
+    std::size_t const equals = argument.find('=');
+    return argument.starts_with("--") && equals != std::string_view::npos ? equals + 1 : std::string_view::npos;
+}
 
 std::string withoutMark(std::string argument)
 {
     return argument.starts_with(mark) ? argument.substr(1) : argument;
 }
 
-/// Shows operands by the name that they were declared with, and no more.
+void restrictTo(CLI::Option* option, std::vector<std::string> const& choices)
+{
+    option->check(CLI::IsMember(choices))
+        ->transform(CLI::Validator([](std::string& text) { return text = withoutMark(text), std::string(); }, ""));
+}
+
+std::string valueName(CLI::Option const& option)
+{
+    std::string const name = option.get_type_name();
+    return name.starts_with(anyText) ? name.substr(anyText.size()) : name;
+}
+
+/// Shows operands by the name that they were declared with and options with one value, and no more.
 class HelpFormatter : public CLI::Formatter
 {
 public:
     std::string make_option_usage(CLI::Option const* option) const override { return make_option_name(option, true); }
     std::string make_option_opts(CLI::Option const* option) const override
     {
-        return option->get_positional() ? "" : Formatter::make_option_opts(option);
+        return option->get_positional() || option->get_items_expected_max() == 0 ? "" : ' ' + valueName(*option);
     }
 };
 
@@ -45,9 +72,13 @@ std::vector<std::string> markedArguments(int count, char const* const* arguments
     for (int i = 1; i < count; ++i) {
         std::string argument = arguments[i];
         bool const isCommand = i == 1;
-        if (!isCommand && (areOperands || !argument.starts_with('-')))
-            argument.insert(argument.begin(), mark);
-        areOperands |= argument == "--";
+        if (!isCommand && !areOperands && argument == "--") {
+            areOperands = true; // the marks say the same, and the parser would end the command here
+            continue;
+        }
+        std::size_t const place = isCommand ? std::string::npos : placeOfMark(argument, areOperands);
+        if (place != std::string::npos)
+            argument.insert(place, 1, mark);
         result.push_back(std::move(argument));
     }
     std::reverse(result.begin(), result.end());
@@ -83,12 +114,47 @@ void addOperand(CLI::App& app, std::string const& name, std::string const& descr
     app.add_option_function<std::string>(name, take, description)->type_name("")->required();
 }
 
+void addValues(CLI::App& app, std::string const& name, std::string const& valueName, std::string const& description,
+               std::function<void(std::string const&)> const& take)
+{
+    std::string const shown = name.substr(name.rfind(',') + 1);
+    auto const takeAll = [shown, take](std::vector<std::string> const& values) {
+        try {
+            for (std::string const& value : values)
+                take(withoutMark(value));
+        } catch (std::invalid_argument const& error) {
+            throw CLI::ValidationError(shown, error.what());
+        }
+    };
+    app.add_option_function<std::vector<std::string>>(name, takeAll, description)
+        ->type_name(valueName)
+        ->allow_extra_args(false);
+}
+
+void addNumber(CLI::App& app, std::string const& name, std::string const& valueName, std::string const& description,
+               std::optional<std::size_t>& value)
+{
+    addValues(app, name, valueName, description, [&value](std::string const& text) {
+        std::size_t number = 0;
+        auto const [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+        if (error != std::errc() || end != text.data() + text.size())
+            throw std::invalid_argument('\'' + text + "' is no whole number");
+        value = number;
+    });
+}
+
 void addChoice(CLI::App& app, std::string const& name, std::string const& description,
                std::vector<std::string> const& choices, std::string& value)
 {
-    app.add_option(name, value, description)
-        ->check(CLI::IsMember(choices))
-        ->transform(CLI::Validator([](std::string& text) { return text = withoutMark(text), std::string(); }, ""));
+    restrictTo(app.add_option(name, value, description), choices);
+}
+
+void addChoices(CLI::App& app, std::string const& name, std::string const& description,
+                std::vector<std::string> const& choices, std::vector<std::string>& values)
+{
+    auto const take = [&values](std::vector<std::string> const& arguments) { values = arguments; };
+    restrictTo(app.add_option_function<std::vector<std::string>>(name, take, description)->allow_extra_args(false),
+               choices);
 }
 
 } // namespace foundation::storage::tool

@@ -1,6 +1,8 @@
 #pragma once
 
+#include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -31,6 +33,19 @@ void addOperands(CLI::App& app, std::string const& name, std::string const& desc
 
 /// Declares the only operand of a command.
 void addOperand(CLI::App& app, std::string const& name, std::string const& description, std::string& value);
+
+/// Declares an option that may be given several times, each time with one value, which goes to `take`. What that throws
+/// as `std::invalid_argument` is misuse of the option. `valueName` is how the help shows the value.
+void addValues(CLI::App& app, std::string const& name, std::string const& valueName, std::string const& description,
+               std::function<void(std::string const&)> const& take);
+
+/// The same, for values that are each one of a few words.
+void addChoices(CLI::App& app, std::string const& name, std::string const& description,
+                std::vector<std::string> const& choices, std::vector<std::string>& values);
+
+/// Declares an option whose value is a whole number.
+void addNumber(CLI::App& app, std::string const& name, std::string const& valueName, std::string const& description,
+               std::optional<std::size_t>& value);
 
 /// Declares an option whose value is one of a few words.
 void addChoice(CLI::App& app, std::string const& name, std::string const& description,

@@ -9,6 +9,8 @@ std::span<Command const> commands()
     static constexpr std::array table{
         Command{"ls", "List folders", defineLs},
         Command{"tree", "Draw a folder and all below it", defineTree},
+        Command{"find", "List what is below folders and fits", defineFind},
+        Command{"du", "Sum up the sizes of files, folder by folder", defineDu},
         Command{"stat", "Say what is known of files and folders", defineStat},
         Command{"cat", "Write files to standard output", defineCat},
         Command{"put", "Write standard input to a file, whole or not at all", definePut},

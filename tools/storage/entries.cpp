@@ -14,16 +14,16 @@ std::string toUtf8(std::u16string const& text)
     return fl::i18n::to_utf8(text, fl::i18n::Malformed::Replace);
 }
 
-Entry emptyEntry(Place const& place, Kind kind)
-{
-    return {place.item().getName(), place.item().getLocation(), kind, {}, {}, {}};
-}
-
 } // namespace
+
+Entry bareEntry(Place const& place, Kind kind)
+{
+    return {place.item().getName(), place.item().getLocation(), kind, {}, {}, {}, {}, {}};
+}
 
 Entry describeEntry(Place const& place)
 {
-    Entry entry = emptyEntry(place, existingKindOf(place));
+    Entry entry = bareEntry(place, existingKindOf(place));
     at(place, [&] {
         if (leadsToFolder(entry.kind)) {
             provider::FolderAttributes const attributes = place.item().getFolderAttributes();
@@ -39,16 +39,25 @@ Entry describeEntry(Place const& place)
     return entry;
 }
 
-Entry describeEntry(Place const& place, Kind kind, provider::FolderEntry const& listed)
+Entry describeEntry(Place const& place, Kind kind, ListedName const& listed)
 {
-    Entry entry = emptyEntry(place, kind);
-    if (auto const& file = listed.getFileAttributes(); file && kind != Kind::BrokenSymlink) {
-        entry.size = file->getSize();
-        entry.modified = file->getLastModified();
-    } else if (auto const& folder = listed.getFolderAttributes()) {
-        entry.modified = folder->getLastModified();
+    Entry entry = bareEntry(place, kind);
+    if (kind != Kind::BrokenSymlink) {
+        entry.size = listed.size;
+        entry.modified = listed.modified;
     }
     return entry;
+}
+
+Kind kindOf(Place const& place, ListedName const& listed)
+{
+    Kind const kind = kindOf(place);
+    return kind == Kind::None ? apparentKind(listed) : kind;
+}
+
+Kind apparentKind(ListedName const& listed)
+{
+    return listed.isFile ? Kind::RegularFile : Kind::RegularFolder;
 }
 
 std::string toJSON(Entry const& entry)
@@ -57,8 +66,12 @@ std::string toJSON(Entry const& entry)
     object["name"] = toUtf8(entry.name);
     object["location"] = toUtf8(entry.location.toString());
     object["type"] = kindName(entry.kind);
+    if (entry.depth)
+        object["depth"] = *entry.depth;
     if (entry.size)
         object["size"] = *entry.size;
+    if (entry.files)
+        object["files"] = *entry.files;
     if (entry.modified && !entry.modified->is_special())
         object["modified"] = formatTime(*entry.modified, Precision::Microseconds);
     if (entry.isWritable)

@@ -42,9 +42,9 @@ public:
 
 private:
     void listFolder(Place const& folder);
-    void listEntry(Place const& folder, provider::FolderEntry const& listed);
+    void listEntry(Place const& folder, ListedName const& listed);
     void printHeading(Place const& folder);
-    Entry entryOf(Place const& folder, provider::FolderEntry const& listed) const;
+    Entry entryOf(Place const& folder, ListedName const& listed) const;
     void print(Entry const& entry, std::string const& name);
     void printName(std::string const& name, bool isFolder);
     std::string longForm(Entry const& entry) const;
@@ -91,7 +91,7 @@ void Lister::listFolder(Place const& folder)
     session_.attempt([&] {
         for (; listing->hasEntry(); at(folder, [&] { listing->next(); })) {
             checkInterrupt();
-            session_.attempt([&] { listEntry(folder, listing->entry()); });
+            session_.attempt([&] { listEntry(folder, ListedName(listing->entry())); });
         }
     });
     sortEntries(sorted_, options_.sort);
@@ -99,16 +99,16 @@ void Lister::listFolder(Place const& folder)
         print(entry, bytesOf(entry.name));
 }
 
-void Lister::listEntry(Place const& folder, provider::FolderEntry const& listed)
+void Lister::listEntry(Place const& folder, ListedName const& listed)
 {
-    if (!options_.isAll && isScratchName(listed.getName()))
+    if (!options_.isAll && isScratchName(listed.name))
         return;
     if (!options_.sort.empty())
         sorted_.push_back(entryOf(folder, listed));
     else if (options_.needsAttributes())
-        print(entryOf(folder, listed), bytesOf(listed.getName()));
+        print(entryOf(folder, listed), bytesOf(listed.name));
     else
-        printName(bytesOf(listed.getName()), !listed.isFile());
+        printName(bytesOf(listed.name), !listed.isFile);
 }
 
 void Lister::printHeading(Place const& folder)
@@ -120,12 +120,10 @@ void Lister::printHeading(Place const& folder)
     isFirst_ = false;
 }
 
-Entry Lister::entryOf(Place const& folder, provider::FolderEntry const& listed) const
+Entry Lister::entryOf(Place const& folder, ListedName const& listed) const
 {
-    Kind const apparent = listed.isFile() ? Kind::RegularFile : Kind::RegularFolder;
-    Place const place = folder.child(listed.getName());
-    Kind kind = options_.needsKind() ? kindOf(place) : apparent;
-    return describeEntry(place, kind == Kind::None ? apparent : kind, listed);
+    Place const place = folder.child(listed.name);
+    return describeEntry(place, options_.needsKind() ? kindOf(place, listed) : apparentKind(listed), listed);
 }
 
 void Lister::print(Entry const& entry, std::string const& name)

@@ -1,8 +1,10 @@
 #include <tools/storage/FolderStack.hpp>
 #include <tools/storage/Session.hpp>
+#include <tools/storage/TreeWalk.hpp>
 #include <tools/storage/arguments.hpp>
 #include <tools/storage/commands.hpp>
 #include <tools/storage/describe.hpp>
+#include <tools/storage/entries.hpp>
 #include <tools/storage/interrupt.hpp>
 #include <tools/storage/kinds.hpp>
 #include <tools/storage/printable.hpp>
@@ -21,6 +23,7 @@ struct Options
     std::vector<std::string> paths{"."};
     bool isAll = false;
     bool isASCII = false;
+    bool isJSON = false;
 };
 
 /// How the lines of a tree begin.
@@ -34,6 +37,47 @@ struct Strokes
 
 constexpr Strokes unicodeStrokes{"├── ", "└── ", "│   ", "    "};
 constexpr Strokes asciiStrokes{"|-- ", "`-- ", "|   ", "    "};
+
+void requireFolder(Place const& root)
+{
+    if (!leadsToFolder(existingKindOf(root)))
+        throw Failure{root.text(), "not a folder"};
+}
+
+/// The tree as objects, one a line.
+class ObjectList : public TreeVisitor
+{
+public:
+    ObjectList(Session& session, bool isAll) : session_(session), isAll_(isAll) {}
+
+    void list(Place const& root)
+    {
+        requireFolder(root);
+        print(describeEntry(root), 0);
+        walkTree(session_, root, Listing::WithAttributes, *this);
+    }
+
+    bool visit(Place const& place, ListedName const& listed, std::size_t depth) override
+    {
+        if (!isAll_ && isScratchName(listed.name))
+            return false;
+        Kind const kind = kindOf(place, listed);
+        print(describeEntry(place, kind, listed), depth);
+        return kind == Kind::RegularFolder;
+    }
+
+private:
+    void print(Entry entry, std::size_t depth)
+    {
+        entry.depth = depth;
+        entry.isWritable.reset(); // not known of what is listed
+        session_.output().write(toJSON(entry));
+        session_.output().endLine();
+    }
+
+    Session& session_;
+    bool isAll_;
+};
 
 class Drawing
 {
@@ -75,8 +119,7 @@ std::string counted(std::uint64_t count, char const* noun)
 
 void Drawing::draw(Place const& root)
 {
-    if (!leadsToFolder(existingKindOf(root)))
-        throw Failure{root.text(), "not a folder"};
+    requireFolder(root);
     session_.output().write(printable(root.text()));
     session_.output().endLine();
     session_.attempt([&] { enter(root, ""); });
@@ -140,16 +183,25 @@ void Drawing::drawLine(char const* stroke, std::u16string const& name, char cons
     output.endLine();
 }
 
+void show(Session& session, Options const& options, Place const& root)
+{
+    if (options.isJSON)
+        ObjectList(session, options.isAll).list(root);
+    else
+        Drawing(session, options).draw(root);
+}
+
 } // namespace
 
 Action defineTree(CLI::App& app)
 {
     auto const options = std::make_shared<Options>();
-    addFlag(app, "-a,--all", options->isAll, "Also draw scratch files, of writes that are not finished");
+    addFlag(app, "-a,--all", options->isAll, "Also show scratch files, of writes that are not finished");
     addFlag(app, "--ascii", options->isASCII, "Draw with ASCII characters");
+    addFlag(app, "--json", options->isJSON, "Print one JSON object a line for each folder and entry instead");
     addOperands(app, "[PATH...]", "Folders to draw; the working folder when there are none", 0, options->paths);
     return [options](Session& session) {
-        session.forEachPlace(options->paths, [&](Place const& place) { Drawing(session, *options).draw(place); });
+        session.forEachPlace(options->paths, [&](Place const& place) { show(session, *options, place); });
     };
 }
 

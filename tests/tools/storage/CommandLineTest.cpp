@@ -15,13 +15,13 @@ TEST_F(CommandLine, PrintsItsVersion)
 TEST_F(CommandLine, HelpNamesEveryCommand)
 {
     std::string const help = runWell({"--help"});
-    for (std::string const name : {"ls", "tree", "stat", "cat", "put", "cp", "mv", "rm", "mkdir"})
+    for (std::string const name : {"ls", "tree", "find", "du", "stat", "cat", "put", "cp", "mv", "rm", "mkdir"})
         EXPECT_NE(help.find("\n  " + name + ' '), std::string::npos) << name;
 }
 
 TEST_F(CommandLine, EachCommandHasHelpOfItsOwn)
 {
-    for (std::string const name : {"ls", "tree", "stat", "cat", "put", "cp", "mv", "rm", "mkdir"})
+    for (std::string const name : {"ls", "tree", "find", "du", "stat", "cat", "put", "cp", "mv", "rm", "mkdir"})
         EXPECT_NE(runWell({name, "--help"}).find("Usage: storage " + name + ' '), std::string::npos) << name;
 }
 
@@ -60,11 +60,23 @@ TEST_F(CommandLine, NamesThatParsersLikeToInterpretAreNames)
     }
 }
 
+TEST_F(CommandLine, HelpShowsOperandsAndValuesByTheirNames)
+{
+    std::string const help = runWell({"find", "--help"});
+    EXPECT_NE(help.find("\nUsage: storage find [OPTIONS] [PATH...]\n"), std::string::npos);
+    EXPECT_NE(help.find("\n  -d,--max-depth N  "), std::string::npos);
+    EXPECT_NE(help.find("\n  --json  "), std::string::npos);
+    EXPECT_NE(runWell({"ls", "--help"}).find("\n  --sort {name,size,time}  "), std::string::npos);
+}
+
 TEST_F(CommandLine, NamesThatBeginWithADashFollowTwoDashes)
 {
     folder.write("-x", "content");
     EXPECT_EQ(runWell({"cat", "--", "-x"}), "content");
     EXPECT_EQ(runWell({"cat", "./-x"}), "content");
+    EXPECT_EQ(runWell({"cat", "./-x", "--", "-x"}), "contentcontent");
+    EXPECT_EQ(runWell({"ls", "--", "-x"}), "-x\n");
+    runFailing({"ls", "--", "--"}, "storage: ls: --: no such file or folder\n");
 }
 
 TEST_F(CommandLine, FullStandardOutputIsAFailure)

@@ -1,5 +1,9 @@
 #include <tests/tools/storage/ToolTest.hpp>
 
+#include <map>
+#include <nlohmann/json.hpp>
+#include <sstream>
+
 namespace {
 
 using Tree = ToolTest;
@@ -67,6 +71,42 @@ TEST_F(Tree, ReportsFoldersThatCannotBeReadAndDrawsTheRest)
     EXPECT_EQ(result.status, 1);
     EXPECT_EQ(result.errors, "storage: tree: a/b: permission denied\n");
     EXPECT_EQ(result.output, "a\n└── b\n\n1 folder, 0 files\n");
+}
+
+TEST_F(Tree, PrintsOneJSONObjectALine)
+{
+    makeFolder("a/b");
+    folder.write("a/b/f", "12345");
+    setTime("a/b/f", 1709210096);
+    makeLink("..", "a/b/up");
+    std::map<std::string, nlohmann::json> objects;
+    std::istringstream lines(runWell({"tree", "--json", "a"}));
+    for (std::string line; std::getline(lines, line);)
+        objects[nlohmann::json::parse(line)["name"]] = nlohmann::json::parse(line);
+    EXPECT_EQ(objects.size(), 4U);
+    EXPECT_EQ(objects["a"]["depth"], 0);
+    EXPECT_EQ(objects["b"]["depth"], 1);
+    EXPECT_EQ(objects["b"]["type"], "folder");
+    EXPECT_EQ(objects["up"]["type"], "link-to-folder");
+    std::string const location = "file://" + folder.path().native() + "/a/b/f";
+    EXPECT_EQ(objects["f"], nlohmann::json({{"name", "f"},
+                                            {"location", location},
+                                            {"type", "file"},
+                                            {"depth", 2},
+                                            {"size", 5},
+                                            {"modified", "2024-02-29T12:34:56.000000Z"}}));
+}
+
+TEST_F(Tree, InJSONTellsOfParentsBeforeWhatTheyHold)
+{
+    makeFolder("a/b/c");
+    folder.write("a/.x", "");
+    folder.write("a/7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak", "");
+    std::vector<int> depths;
+    std::istringstream lines(runWell({"tree", "--json", "a"}));
+    for (std::string line; std::getline(lines, line);)
+        depths.push_back(nlohmann::json::parse(line)["depth"]);
+    EXPECT_TRUE(depths == std::vector({0, 1, 2, 1}) || depths == std::vector({0, 1, 1, 2}));
 }
 
 TEST_F(Tree, GoesDeeperThanListingsCanBeOpen)
