@@ -88,12 +88,12 @@ void appendPath(std::u16string& text, std::u16string path, bool hasScheme, bool 
     text += path;
 }
 
-void appendPlain(std::u16string& text, bool present, char16_t introducer, std::wstring const& plain)
+void appendQueryAndFragment(std::u16string& text, IRIArgs const& args)
 {
-    if (!present)
-        return;
-    text += introducer;
-    detail::appendEncoded(text, plain, detail::inQuery);
+    if (args.hasQuery)
+        detail::appendEncoded(text += u'?', args.query, detail::inQuery);
+    if (args.hasFragment)
+        detail::appendEncoded(text += u'#', args.fragment, detail::inFragment);
 }
 
 std::u16string writtenForm(IRIArgs const& args)
@@ -106,8 +106,7 @@ std::u16string writtenForm(IRIArgs const& args)
     if (hasAuthority)
         appendAuthority(text, args);
     appendPath(text, writtenPath(args), args.hasScheme, hasAuthority);
-    appendPlain(text, args.hasQuery, u'?', args.query);
-    appendPlain(text, args.hasFragment, u'#', args.fragment);
+    appendQueryAndFragment(text, args);
     return text;
 }
 

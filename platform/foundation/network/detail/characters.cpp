@@ -18,7 +18,7 @@ constexpr void mark(std::array<CharacterClass, 256>& classes, std::string_view c
 constexpr std::array<CharacterClass, 256> makeClasses()
 {
     std::array<CharacterClass, 256> classes{};
-    constexpr unsigned data = inUserInfo | inHost | inPath | inQuery | inIPLiteral;
+    constexpr unsigned data = inUserInfo | inHost | inPath | inQuery | inFragment | inIPLiteral;
     for (unsigned c = 0; c <= ' '; ++c)
         classes[c] = impossible;
     for (unsigned c = 0x7F; c <= 0x9F; ++c)
@@ -27,10 +27,10 @@ constexpr std::array<CharacterClass, 256> makeClasses()
     mark(classes, "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz", alpha | schemeCharacter | data);
     mark(classes, "0123456789+-.", schemeCharacter | data);
     mark(classes, "_~!$&'()*,;=", data);
-    mark(classes, ":", inUserInfo | inPath | inQuery | inIPLiteral);
-    mark(classes, "@", inPath | inQuery);
-    mark(classes, "/", inPath | inQuery | endsAuthority);
-    mark(classes, "?", inQuery | endsAuthority | endsPath);
+    mark(classes, ":", inUserInfo | inPath | inQuery | inFragment | inIPLiteral);
+    mark(classes, "@", inPath | inQuery | inFragment);
+    mark(classes, "/", inPath | inQuery | inFragment | endsAuthority);
+    mark(classes, "?", inQuery | inFragment | endsAuthority | endsPath);
     mark(classes, "#", endsAuthority | endsPath);
     mark(classes, "%", percent);
     return classes;

@@ -18,11 +18,12 @@ inline constexpr CharacterClass percent = 1U << 3;
 inline constexpr CharacterClass inUserInfo = 1U << 4;
 inline constexpr CharacterClass inHost = 1U << 5;
 inline constexpr CharacterClass inPath = 1U << 6;
-inline constexpr CharacterClass inQuery = 1U << 7; ///< and in a fragment
+inline constexpr CharacterClass inQuery = 1U << 7;
 inline constexpr CharacterClass inIPLiteral = 1U << 8;
 inline constexpr CharacterClass endsAuthority = 1U << 9;
 inline constexpr CharacterClass endsPath = 1U << 10;
 inline constexpr CharacterClass surrogate = 1U << 11;
+inline constexpr CharacterClass inFragment = 1U << 12;
 inline constexpr CharacterClass anyClass = 0xFFFF;
 
 /// Those of the characters up to U+00FF.

@@ -118,6 +118,15 @@ TEST(IRIArgs, EscapesWhatTheOtherComponentsMayNotHold)
     EXPECT_EQ(IRI(args).toString(), u"s://u:%40%2F%20@h%3A%40%2F%3F%23%20\u00E9/?q/?:@%23%5B%5D\uE000#f/?:@%23%2541");
 }
 
+// RFC 3987, section 2.2: iprivate is part of iquery, and of nothing else.
+TEST(IRIArgs, WritesPrivateCharactersInAQueryAlone)
+{
+    IRIArgs args = schemeAndPath(L"s", L"/\uE000");
+    args.userInfo = args.host = args.query = args.fragment = L"\uE000";
+    args.hasUserInfo = args.hasHost = args.hasQuery = args.hasFragment = true;
+    EXPECT_EQ(IRI(args).toString(), u"s://%EE%80%80@%EE%80%80/%EE%80%80?\uE000#%EE%80%80");
+}
+
 TEST(IRIArgs, KeepsAnIPLiteral)
 {
     IRIArgs args = schemeAndPath(L"s", L"/");
