@@ -6,7 +6,6 @@
 #include <storage/provider/detail/ContainerImpl.hpp>
 #include <storage/provider/detail/UPathIRIImpl.hpp>
 
-#include <cstdint>
 #include <ostream>
 #include <sstream>
 #include <stdexcept>
@@ -189,18 +188,7 @@ std::u16string StorageIRI::makePathRelativeTo(StorageIRI const& base) const
 
 std::size_t StorageIRI::hashValue() const
 {
-    constexpr std::uint64_t multiplier = 0xc6a4a7935bd1e995U;
-    constexpr unsigned shift = 47;
-    std::uint64_t hash = 0;
-    for (char16_t const unit : toString()) {
-        std::uint64_t key = unit * multiplier;
-        key ^= key >> shift;
-        key *= multiplier;
-        hash ^= key;
-        hash *= multiplier;
-        hash += 0xe6546b64U;
-    }
-    return hash;
+    return implementation_->hash();
 }
 
 bool StorageIRI::operator==(StorageIRI const& other) const

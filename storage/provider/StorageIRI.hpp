@@ -95,6 +95,7 @@ public:
     std::u16string makePathRelativeTo(StorageIRI const& base) const;
 
     /// A 64-bit fold of the code units of `toString`, the same on every machine and with every version of Boost.
+    /// Folded on first request, and kept for all copies.
     std::size_t hashValue() const;
 
     bool operator==(StorageIRI const& other) const;

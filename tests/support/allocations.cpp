@@ -8,6 +8,7 @@ namespace {
 
 thread_local std::size_t calls = 0;
 thread_local std::size_t callToFail = 0; // 0: none
+thread_local std::ptrdiff_t living = 0;
 
 void* allocate(std::size_t size)
 {
@@ -15,7 +16,15 @@ void* allocate(std::size_t size)
     void* const memory = calls == callToFail ? nullptr : std::malloc(size == 0 ? 1 : size);
     if (memory == nullptr)
         throw std::bad_alloc();
+    ++living;
     return memory;
+}
+
+void release(void* memory)
+{
+    if (memory != nullptr)
+        --living;
+    std::free(memory);
 }
 
 } // namespace
@@ -25,6 +34,11 @@ namespace foundation::tests::support {
 std::size_t allocations()
 {
     return calls;
+}
+
+std::ptrdiff_t livingAllocations()
+{
+    return living;
 }
 
 FailingAllocation::FailingAllocation(std::size_t number)
@@ -51,20 +65,20 @@ void* operator new[](std::size_t size)
 
 void operator delete(void* memory) noexcept
 {
-    std::free(memory);
+    release(memory);
 }
 
 void operator delete[](void* memory) noexcept
 {
-    std::free(memory);
+    release(memory);
 }
 
 void operator delete(void* memory, std::size_t) noexcept
 {
-    std::free(memory);
+    release(memory);
 }
 
 void operator delete[](void* memory, std::size_t) noexcept
 {
-    std::free(memory);
+    release(memory);
 }

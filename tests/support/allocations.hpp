@@ -8,6 +8,9 @@ namespace foundation::tests::support {
 /// How often this thread has called `operator new` so far.
 std::size_t allocations();
 
+/// How many more blocks this thread has taken from `operator new` than it has given back.
+std::ptrdiff_t livingAllocations();
+
 /// How often `action` calls `operator new`.
 template <class Action>
 std::size_t allocationsOf(Action action)

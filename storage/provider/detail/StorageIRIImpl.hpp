@@ -5,8 +5,14 @@
 #include <foundation/network/IRI.hpp>
 #include <storage/provider/detail/LazyField.hpp>
 
+#include <atomic>
+#include <cstddef>
 #include <memory>
 #include <string>
+
+namespace foundation::storage::provider {
+class StorageIRI;
+} // namespace foundation::storage::provider
 
 namespace foundation::storage::provider::detail {
 
@@ -50,6 +56,13 @@ protected:
     StorageIRIImpl();
 
 private:
+    friend class provider::StorageIRI;
+
+    /// The hash of `toString`, folded on first request.
+    std::size_t hash() const;
+
+    /// 0 until the text is folded. A text whose hash is 0 is folded each time; the empty one is the only one known.
+    mutable std::atomic<std::size_t> hash_{0};
     LazyField<std::u16string> resolvedPath_;
 };
 

@@ -13,6 +13,7 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <vector>
 
 namespace foundation::storage::provider {
 namespace {
@@ -84,6 +85,45 @@ TEST(FailingAllocation, LeavesTheExceptionThatCannotBeClonedAsItWas)
     EXPECT_GT(failEachAllocationOf([&] { std::unique_ptr<core::except::IException> const copy(exception.clone()); }),
               0u);
     EXPECT_EQ(exception.getStorageIRI(), here);
+}
+
+/// Each makes a location of another kind; those that are made from another one find in it what they need.
+std::vector<std::function<StorageIRI()>> makers()
+{
+    StorageIRI const container(u"scheme://host.example/a-container.zip");
+    static_cast<void>(container.getParent());
+    return {[] { return StorageIRI(u"scheme://host.example/a-folder/./with-a-long-name/"); },
+            [] { return StorageIRI(u"zip:scheme://host.example/a-container.zip!/a%20folder/with-a-long-name"); },
+            [] { return StorageIRI(u"a-scheme", fl::filesystem::upath(u"/a folder/with-a-long-name")); },
+            [container] { return StorageIRI(u"zip", container, u"/a folder/with-a-long-name"); },
+            [container] { return StorageIRI(container, u"a child with a long name"); }};
+}
+
+TEST(FailingAllocation, LeavesNothingOfALocationThatCannotBeMade)
+{
+    for (auto const& make : makers()) {
+        std::ptrdiff_t const before = livingAllocations();
+        EXPECT_GT(tests::support::failEachAllocationOf([&make] { make(); },
+                                                       [before] { EXPECT_EQ(livingAllocations(), before); }),
+                  1u);
+    }
+}
+
+TEST(FailingAllocation, LeavesALocationToBeAskedAgain)
+{
+    for (auto const& make : makers()) {
+        StorageIRI const expected = make();
+        StorageIRI const location = make();
+        std::size_t const failures = failEachAllocationOf([&] {
+            EXPECT_EQ(location.getParent().toString(), expected.getParent().toString());
+            EXPECT_EQ(location.getName(), expected.getName());
+            EXPECT_EQ(location.getPath(), expected.getPath());
+            EXPECT_EQ(location.getResolvedPath(), expected.getResolvedPath());
+            EXPECT_EQ(location.hashValue(), expected.hashValue());
+            EXPECT_EQ(location.toString(), expected.toString());
+        });
+        EXPECT_GT(failures, 3u) << expected;
+    }
 }
 
 TEST(FailingAllocation, LeavesADeferredFlagToBeAskedAgain)

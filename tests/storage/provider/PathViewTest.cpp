@@ -233,6 +233,15 @@ TEST(PathViewIterator, GoesOnBehindAnEmptyComponentWhenAskedTo)
     EXPECT_EQ(copyOf(*iterator), u"b");
 }
 
+TEST(PathViewIterator, TrailingSlashBeginsNoComponent)
+{
+    std::u16string const path = u"/ab/";
+    PathViewIterator iterator{u16string_view(path)};
+    EXPECT_EQ(copyOf(*iterator), u"ab");
+    ++iterator;
+    EXPECT_TRUE(iterator == PathViewIterator());
+}
+
 TEST(PathViewIterator, ComparesTheTextOfComponentsAndNotTheirPlace)
 {
     std::u16string const path = u"/a/b/a";

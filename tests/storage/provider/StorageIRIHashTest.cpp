@@ -8,11 +8,15 @@
 
 #include <cstdint>
 #include <functional>
+#include <memory>
+#include <stdexcept>
 #include <string>
 #include <unordered_map>
 #include <unordered_set>
 
 #include <tests/support/generators.hpp>
+#include <tests/support/inThreads.hpp>
+#include <tests/support/locationWithText.hpp>
 
 namespace foundation::storage::provider {
 namespace {
@@ -34,6 +38,24 @@ std::uint64_t folded(std::u16string const& text)
     return static_cast<std::uint64_t>(hash);
 }
 
+/// Counts how often its text is asked for, and fails the time with the number `failing`.
+class AskedImpl : public tests::support::TextOnlyImpl
+{
+public:
+    using TextOnlyImpl::TextOnlyImpl;
+
+    std::u16string const& toString() const override
+    {
+        ++asked;
+        if (asked == failing)
+            throw std::runtime_error("not yet");
+        return TextOnlyImpl::toString();
+    }
+
+    mutable int asked = 0;
+    int failing = 0;
+};
+
 TEST(StorageIRIHash, HasTheSameValuesEverywhere)
 {
     EXPECT_EQ(StorageIRI(u"s:/").hashValue(), 0xb6267209ac739dfeU);
@@ -46,6 +68,32 @@ TEST(StorageIRIHash, IsThatOfTheCanonicalText)
 {
     EXPECT_EQ(StorageIRI(u"s://h/a/").hashValue(), StorageIRI(u"s://h/a").hashValue());
     EXPECT_NE(StorageIRI(u"s://h/A").hashValue(), StorageIRI(u"s://h/a").hashValue());
+}
+
+TEST(StorageIRIHash, OfNoTextIsZero)
+{
+    EXPECT_EQ(tests::support::locationWithText(u"").hashValue(), 0u);
+}
+
+TEST(StorageIRIHash, IsFoldedOnceForAllCopies)
+{
+    auto const implementation = std::make_shared<AskedImpl>(u"s:/a");
+    StorageIRI const location{std::shared_ptr<detail::StorageIRIImpl>(implementation)};
+    StorageIRI const copy = location;
+    for (int i = 0; i != 2; ++i) {
+        EXPECT_EQ(location.hashValue(), folded(u"s:/a"));
+        EXPECT_EQ(copy.hashValue(), folded(u"s:/a"));
+    }
+    EXPECT_EQ(implementation->asked, 1);
+}
+
+TEST(StorageIRIHash, IsAskedForAgainAfterTheTextCouldNotBeMade)
+{
+    auto const implementation = std::make_shared<AskedImpl>(u"s:/a");
+    implementation->failing = 1;
+    StorageIRI const location{std::shared_ptr<detail::StorageIRIImpl>(implementation)};
+    EXPECT_THROW(static_cast<void>(location.hashValue()), std::runtime_error);
+    EXPECT_EQ(location.hashValue(), folded(u"s:/a"));
 }
 
 TEST(StorageIRIHash, ServesTheHashersOfBoostAndOfTheStandardLibrary)
@@ -73,6 +121,15 @@ RC_GTEST_PROP(StorageIRIHash, IsTheFoldOfTheCodeUnits, ())
 {
     StorageIRI const location(StorageIRI(u"s://h/"), *tests::support::fileName());
     RC_ASSERT(location.hashValue() == folded(location.toString()));
+}
+
+TEST(StorageIRIHashConcurrency, ManyThreadsGetTheSameOfAFreshLocation)
+{
+    std::uint64_t const expected = folded(u"s://h/a/b");
+    for (int round = 0; round != 10; ++round) {
+        StorageIRI const location(u"s://h/a/b/");
+        tests::support::inThreads(32, [&](int) { EXPECT_EQ(location.hashValue(), expected); });
+    }
 }
 
 } // namespace
