@@ -158,6 +158,12 @@ void hash_StorageIRI(benchmark::State& state)
 }
 BENCHMARK(hash_StorageIRI);
 
+void text_to_hash_StorageIRI(benchmark::State& state)
+{
+    forEach(state, addresses(), [](std::u16string const& text) { keep(StorageIRI(text).hashValue()); });
+}
+BENCHMARK(text_to_hash_StorageIRI);
+
 void lookup_StorageIRI(benchmark::State& state)
 {
     std::unordered_map<StorageIRI, std::size_t> map;
@@ -299,6 +305,15 @@ void hash_BoostURL(benchmark::State& state)
             [](urls::url const& url) { keep(std::hash<std::string_view>()(std::string_view(url.buffer()))); });
 }
 BENCHMARK(hash_BoostURL);
+
+void text_to_hash_BoostURL(benchmark::State& state)
+{
+    forEach(state, urlTexts(), [](std::string const& text) {
+        urls::url const url = parse(text);
+        keep(std::hash<std::string_view>()(std::string_view(url.buffer())));
+    });
+}
+BENCHMARK(text_to_hash_BoostURL);
 
 void lookup_BoostURL(benchmark::State& state)
 {
