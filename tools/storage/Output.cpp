@@ -1,5 +1,7 @@
 #include <tools/storage/Output.hpp>
 
+#include <tools/storage/interrupt.hpp>
+
 #include <cerrno>
 #include <unistd.h>
 
@@ -12,6 +14,7 @@ constexpr std::size_t bufferSize = std::size_t{64} << 10U;
 void writeAll(std::string_view bytes)
 {
     while (!bytes.empty()) {
+        waitForOutput(STDOUT_FILENO);
         ssize_t const written = ::write(STDOUT_FILENO, bytes.data(), bytes.size());
         if (written >= 0)
             bytes.remove_prefix(static_cast<std::size_t>(written));

@@ -21,7 +21,7 @@ public:
 
     bool isTerminal() const { return isTerminal_; }
 
-    /// Throws `OutputFailure`, as does `flush`.
+    /// Throws `OutputFailure`, and `Interrupted` while nobody takes what is written; as does `flush`.
     void write(std::string_view bytes);
 
     /// Ends a line, which a terminal shows at once.

@@ -58,6 +58,21 @@ void catchInterrupt(int signal)
     sigaction(signal, &action, nullptr);
 }
 
+bool isReady(int descriptor, short event)
+{
+    pollfd wanted{descriptor, event, 0};
+    return ::poll(&wanted, 1, 0) == 1;
+}
+
+void waitFor(int descriptor, short event)
+{
+    HeldInterrupts const held;
+    pollfd wanted{descriptor, event, 0};
+    do
+        checkInterrupt();
+    while (::ppoll(&wanted, 1, nullptr, &held.maskBefore()) == -1 && errno == EINTR);
+}
+
 } // namespace
 
 void catchInterrupts()
@@ -74,11 +89,13 @@ void checkInterrupt()
 
 void waitForInput(int descriptor)
 {
-    HeldInterrupts const held;
-    pollfd wanted{descriptor, POLLIN, 0};
-    do
-        checkInterrupt();
-    while (::ppoll(&wanted, 1, nullptr, &held.maskBefore()) == -1 && errno == EINTR);
+    waitFor(descriptor, POLLIN);
+}
+
+void waitForOutput(int descriptor)
+{
+    if (!isReady(descriptor, POLLOUT))
+        waitFor(descriptor, POLLOUT);
 }
 
 } // namespace foundation::storage::tool

@@ -19,4 +19,8 @@ void checkInterrupt();
 /// wait.
 void waitForInput(int descriptor);
 
+/// Waits until a descriptor can be written. Throws `Interrupted` only if that takes waiting, so that what was done
+/// before an interrupt can be told.
+void waitForOutput(int descriptor);
+
 } // namespace foundation::storage::tool

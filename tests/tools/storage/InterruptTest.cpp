@@ -2,7 +2,10 @@
 
 #include <chrono>
 #include <csignal>
+#include <fcntl.h>
+#include <sys/ioctl.h>
 #include <thread>
+#include <unistd.h>
 
 namespace {
 
@@ -76,6 +79,27 @@ TEST_F(Interrupt, EndsARecursiveCopy)
     EXPECT_EQ(result.status, 130);
     EXPECT_EQ(result.errors, "storage: cp: interrupted\n");
     EXPECT_EQ(countEntries("t/d"), 0U);
+}
+
+TEST_F(Interrupt, EndsAtOnceWhileNobodyReadsTheOutput)
+{
+    makePipe("pipe");
+    ProcessOptions options = inFolder();
+    options.output = folder / "pipe";
+    int const pipe = ::open(options.output.c_str(), O_RDWR | O_CLOEXEC);
+    int const capacity = ::fcntl(pipe, F_GETPIPE_SZ);
+    ASSERT_GT(capacity, 0);
+    Process process(command({"cat", "big"}), options);
+    auto const deadline = std::chrono::steady_clock::now() + 60s;
+    int held = 0;
+    while (held < capacity && process.isRunning() && std::chrono::steady_clock::now() < deadline)
+        ASSERT_EQ(::ioctl(pipe, FIONREAD, &held), 0);
+    EXPECT_EQ(held, capacity);
+    process.send(SIGINT);
+    ProgramResult const result = process.finish();
+    EXPECT_EQ(result.status, 130);
+    EXPECT_EQ(result.errors, "storage: cat: interrupted\n");
+    ::close(pipe);
 }
 
 } // namespace
