@@ -47,6 +47,26 @@ TEST(Lock, LazyFieldTakesOneUntilItsValueIsPresent)
     EXPECT_EQ(locksOf([&field] { EXPECT_TRUE(field.isPresent()); }), 0u);
 }
 
+// Each field that is computed takes its lock: none is computed here.
+TEST(Lock, MakingALocationNeedsNone)
+{
+    StorageIRI const base(u"s://h/a");
+    static_cast<void>(base.getParent());
+    EXPECT_EQ(locksOf([] { StorageIRI(u"s://h/a/../b/"); }), 0u);
+    EXPECT_EQ(locksOf([] { StorageIRI(u"s", fl::filesystem::upath(u"/a")); }), 0u);
+    EXPECT_EQ(locksOf([] { StorageIRI(u"z:s://h/a!/b"); }), 0u);
+    EXPECT_EQ(locksOf([&base] { StorageIRI(base, u"b"); }), 0u);
+    EXPECT_EQ(locksOf([&base] { StorageIRI(u"z", base, u"/b"); }), 0u);
+}
+
+TEST(Lock, ChildIsNotParsedBeforeItIsNeeded)
+{
+    StorageIRI const child(StorageIRI(u"s://h/a"), u"b");
+    EXPECT_EQ(locksOf([&child] { StorageIRI(child, u"/c"); }), 0u);
+    // The IRI and the text; the record is there from the start.
+    EXPECT_EQ(locksOf([&child] { static_cast<void>(child.toString()); }), 2u);
+}
+
 TEST(Lock, RepeatedQueryOfALocationNeedsNone)
 {
     for (StorageIRI const& location : {StorageIRI(u"s://h/a/../b"), StorageIRI(u"s", fl::filesystem::upath(u"/a/../b")),

@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include <boost/iterator/iterator_categories.hpp>
+
 #include <iterator>
 #include <string>
 #include <type_traits>
@@ -33,6 +35,11 @@ TEST(PathView, IsEmptyByDefault)
     EXPECT_EQ(view.getParentCopy(), u"");
     EXPECT_EQ(view.getFilenameCopy(), u"");
     EXPECT_TRUE(view.begin() == view.end());
+}
+
+TEST(PathView, ViewsAreThoseOfBoost)
+{
+    EXPECT_TRUE((std::is_same_v<u16string_view, boost::basic_string_view<char16_t>>));
 }
 
 TEST(PathView, IsMadeFromTextExplicitly)
@@ -197,6 +204,9 @@ TEST(PathViewIterator, IsAForwardIterator)
     using Traits = std::iterator_traits<PathViewIterator>;
     EXPECT_TRUE((std::is_same_v<Traits::value_type, u16string_view>));
     EXPECT_TRUE((std::is_same_v<Traits::reference, u16string_view>));
+    using Traversal = boost::iterator_traversal<PathViewIterator>::type;
+    EXPECT_TRUE((std::is_convertible_v<Traversal, boost::forward_traversal_tag>));
+    EXPECT_FALSE((std::is_convertible_v<Traversal, boost::bidirectional_traversal_tag>));
     std::u16string const path = u"/a/b";
     PathViewIterator first{u16string_view(path)};
     PathViewIterator const before = first++;

@@ -297,12 +297,6 @@ TEST(HierarchicalImpl, RelativeIsNotLookedAtBeforeItIsNeeded)
     EXPECT_EQ(relative->withPath(u"/b")->toString(), u"s://h/b");
 }
 
-TEST(HierarchicalImpl, ConstructionComputesNothing)
-{
-    Counting const location{IRI(u"s://h/a/b")};
-    EXPECT_EQ(location.iris + location.paths + location.relatives, 0);
-}
-
 TEST(HierarchicalImpl, KeepsWhatItComputed)
 {
     Counting const location{IRI(u"s://h/a/b")};
