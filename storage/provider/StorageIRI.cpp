@@ -1,7 +1,5 @@
 #include <storage/provider/StorageIRI.hpp>
 
-#include <foundation/network/IRIArgs.hpp>
-#include <foundation/network/wide.hpp>
 #include <foundation/ustring.hpp>
 #include <storage/provider/detail/ContainerImpl.hpp>
 #include <storage/provider/detail/UPathIRIImpl.hpp>
@@ -36,14 +34,6 @@ std::u16string childPath(StorageIRI const& base, std::u16string const& child)
         return joinPath(base.getPath(), child);
     auto const firstOther = child.find_first_not_of(separator);
     return separator + (firstOther == std::u16string::npos ? std::u16string() : child.substr(firstOther));
-}
-
-network::IRI pathOnlyIRI(std::u16string const& path)
-{
-    network::IRIArgs args;
-    args.path = network::toWide(path);
-    args.hasPath = true;
-    return network::IRI(args);
 }
 
 [[noreturn]] void throwNoCommonRoot(StorageIRI const& location, StorageIRI const& base)
@@ -182,7 +172,7 @@ std::u16string StorageIRI::makePathRelativeTo(StorageIRI const& base) const
     std::u16string baseFolder = base.getPath();
     if (baseFolder.size() > 1)
         baseFolder += separator;
-    network::IRI const relative = pathOnlyIRI(getPath()).makeRelativeTo(pathOnlyIRI(baseFolder));
+    network::IRI const relative = detail::iriOfPath(getPath()).makeRelativeTo(detail::iriOfPath(baseFolder));
     return relative.getPath(network::iri::Encoding::Decoded);
 }
 

@@ -22,13 +22,8 @@ std::u16string resolvePath(std::u16string base, std::u16string const& path)
         base += u'/';
     if (path.find(u'/') == std::u16string::npos && path != u"." && path != u"..")
         return base + path;
-    network::IRIArgs args;
-    args.hasPath = true;
-    args.path = network::toWide(base);
-    network::IRI const baseIRI(args);
-    args.path = network::toWide(path);
-    network::IRI const reference(args);
-    std::u16string resolved = reference.resolveAgainst(baseIRI).getPath(network::iri::Encoding::Decoded);
+    network::IRI const reference = iriOfPath(path);
+    std::u16string resolved = reference.resolveAgainst(iriOfPath(base)).getPath(network::iri::Encoding::Decoded);
     stripTrailingSlash(resolved);
     return resolved;
 }
@@ -79,6 +74,15 @@ std::size_t StorageIRIImpl::hash() const
         hash_.store(known, std::memory_order_relaxed);
     }
     return known;
+}
+
+network::IRI iriOfPath(std::u16string const& path)
+{
+    network::IRIArgs args;
+    args.hasHost = path.starts_with(u'/');
+    args.hasPath = true;
+    args.path = network::toWide(path);
+    return network::IRI(args);
 }
 
 void stripTrailingSlash(std::u16string& path)

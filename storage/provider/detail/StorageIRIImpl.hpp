@@ -69,6 +69,10 @@ private:
 /// The implementation for a parsed IRI: a container location for an opaque one, a hierarchical location for any other.
 std::shared_ptr<StorageIRIImpl> makeStorageIRIImpl(network::IRI iri);
 
+/// The reference of a plain path alone. An absolute one stands behind an empty authority, where a leading "//" stays
+/// two separators; without an authority it would be written "/%2F…", as part of a name.
+network::IRI iriOfPath(std::u16string const& path);
+
 /// Removes one trailing '/' of a text that is longer than that.
 void stripTrailingSlash(std::u16string& path);
 

@@ -249,6 +249,10 @@ TEST(StorageIRI, RelativePathLeadsFromTheFolder)
              {u"/a//b", u"/a", u".//b"},
              {u"/a/./b", u"/a", u"./b"},
              {u"/a/b", u"", u"/a/b"},
+             {u"", u"/a", u"../"},
+             {u"//a", u"/", u".//a"},
+             {u"/a", u"//b", u"../../a"},
+             {u"//b/c", u"//b", u"c"},
          })
         EXPECT_EQ(StorageIRI(u"s://h" + path).makePathRelativeTo(StorageIRI(u"s://h" + base)), relative);
 }

@@ -121,6 +121,15 @@ TEST(StorageIRIImpl, ResolvedPathHasNoDotSegments)
     EXPECT_EQ(resolved(u"/..."), u"/...");
 }
 
+TEST(StorageIRIImpl, ResolvedPathOfALeadingDoubleSlashHasNoDotSegmentsEither)
+{
+    EXPECT_EQ(resolved(u"//../a"), u"/a");
+    EXPECT_EQ(resolved(u"//./a"), u"//a");
+    EXPECT_EQ(resolved(u"//a/../b"), u"//b");
+    EXPECT_EQ(resolved(u"//a/.."), u"/");
+    EXPECT_EQ(resolved(u"/a/..//b"), u"//b");
+}
+
 TEST(StorageIRIImpl, ResolvedPathOfTheShortestPathsIsThePath)
 {
     EXPECT_EQ(resolved(u"/"), u"/");
