@@ -1,5 +1,5 @@
 # cmake --install and find_package(foundation_storage): every library made by foundation_add_library, its headers, and the
-# command line tool.
+# command line tool with its manual page and what lets shells complete its commands.
 include(CMakePackageConfigHelpers)
 
 set(package_dir "${CMAKE_INSTALL_LIBDIR}/cmake/foundation_storage")
@@ -57,5 +57,9 @@ install(FILES
 if(TARGET storage_tool)
     foundation_set_rpath(storage_tool "${CMAKE_INSTALL_BINDIR}")
     install(TARGETS storage_tool)
+    if(TARGET storage_tool_share)
+        get_target_property(tool_dir storage_tool BINARY_DIR)
+        install(DIRECTORY "${tool_dir}/share/" DESTINATION "${CMAKE_INSTALL_DATAROOTDIR}")
+    endif()
 endif()
 install(FILES "${PROJECT_SOURCE_DIR}/LICENSE" DESTINATION "${CMAKE_INSTALL_DATAROOTDIR}/doc/foundation-storage")

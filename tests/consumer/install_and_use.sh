@@ -32,3 +32,8 @@ fi
 touch -- "$work/folder/a file"
 listed=$("$work/moved/bin/storage" ls "$work/folder")
 [[ $listed == "a file" ]] || { echo "the installed tool lists: $listed"; exit 1; }
+share=$work/moved/share
+for file in man/man1/storage.1 bash-completion/completions/storage fish/vendor_completions.d/storage.fish \
+    zsh/site-functions/_storage; do
+    grep --quiet mkdir -- "$share/$file" || { echo "not installed, or without a command of the tool: share/$file"; exit 1; }
+done

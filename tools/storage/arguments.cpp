@@ -38,12 +38,6 @@ void restrictTo(CLI::Option* option, std::vector<std::string> const& choices)
         ->transform(CLI::Validator([](std::string& text) { return text = withoutMark(text), std::string(); }, ""));
 }
 
-std::string valueName(CLI::Option const& option)
-{
-    std::string const name = option.get_type_name();
-    return name.starts_with(anyText) ? name.substr(anyText.size()) : name;
-}
-
 /// Shows operands by the name that they were declared with and options with one value, and no more.
 class HelpFormatter : public CLI::Formatter
 {
@@ -51,11 +45,20 @@ public:
     std::string make_option_usage(CLI::Option const* option) const override { return make_option_name(option, true); }
     std::string make_option_opts(CLI::Option const* option) const override
     {
-        return option->get_positional() || option->get_items_expected_max() == 0 ? "" : ' ' + valueName(*option);
+        std::string const value = option->get_positional() ? "" : valueName(*option);
+        return value.empty() ? "" : ' ' + value;
     }
 };
 
 } // namespace
+
+std::string valueName(CLI::Option const& option)
+{
+    std::string const name = option.get_type_name();
+    if (option.get_items_expected_max() == 0)
+        return "";
+    return name.starts_with(anyText) ? name.substr(anyText.size()) : name;
+}
 
 std::shared_ptr<CLI::FormatterBase> makeHelpFormatter()
 {
@@ -155,6 +158,12 @@ void addChoices(CLI::App& app, std::string const& name, std::string const& descr
     auto const take = [&values](std::vector<std::string> const& arguments) { values = arguments; };
     restrictTo(app.add_option_function<std::vector<std::string>>(name, take, description)->allow_extra_args(false),
                choices);
+}
+
+void addChoiceOperand(CLI::App& app, std::string const& name, std::string const& description,
+                      std::vector<std::string> const& choices, std::string& value)
+{
+    restrictTo(app.add_option(name, value, description)->required(), choices);
 }
 
 } // namespace foundation::storage::tool

@@ -9,6 +9,7 @@
 namespace CLI {
 class App;
 class FormatterBase;
+class Option;
 } // namespace CLI
 
 namespace foundation::storage::tool {
@@ -20,6 +21,9 @@ std::vector<std::string> markedArguments(int count, char const* const* arguments
 
 /// The text without marks: an argument that the parser hands back, or a message of the parser about one.
 std::string unmarked(std::string text);
+
+/// How the help calls the value of an option; empty for a flag.
+std::string valueName(CLI::Option const& option);
 
 /// Lays out the help.
 std::shared_ptr<CLI::FormatterBase> makeHelpFormatter();
@@ -33,6 +37,10 @@ void addOperands(CLI::App& app, std::string const& name, std::string const& desc
 
 /// Declares the only operand of a command.
 void addOperand(CLI::App& app, std::string const& name, std::string const& description, std::string& value);
+
+/// Declares the only operand of a command, which is one of a few words.
+void addChoiceOperand(CLI::App& app, std::string const& name, std::string const& description,
+                      std::vector<std::string> const& choices, std::string& value);
 
 /// Declares an option that may be given several times, each time with one value, which goes to `take`. What that throws
 /// as `std::invalid_argument` is misuse of the option. `valueName` is how the help shows the value.

@@ -9,7 +9,7 @@ std::span<Command const> commands()
     static constexpr std::array table{
         Command{"ls", "List folders", defineLs},
         Command{"tree", "Draw a folder and all below it", defineTree},
-        Command{"find", "List what is below folders and fits", defineFind},
+        Command{"find", "List what lies below folders and has a name, type, size or time", defineFind},
         Command{"du", "Sum up the sizes of files, folder by folder", defineDu},
         Command{"stat", "Say what is known of files and folders", defineStat},
         Command{"cat", "Write files to standard output", defineCat},
@@ -18,6 +18,8 @@ std::span<Command const> commands()
         Command{"mv", "Move or rename files and folders", defineMv},
         Command{"rm", "Remove files and folders", defineRm},
         Command{"mkdir", "Make folders", defineMkdir},
+        Command{"completion", "Print a script that has a shell complete commands", defineCompletion},
+        Command{"man", "Print the manual page, as roff", defineMan},
     };
     return table;
 }

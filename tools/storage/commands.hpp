@@ -7,10 +7,12 @@
 namespace foundation::storage::tool {
 
 Action defineCat(CLI::App& app);
+Action defineCompletion(CLI::App& app);
 Action defineCp(CLI::App& app);
 Action defineDu(CLI::App& app);
 Action defineFind(CLI::App& app);
 Action defineLs(CLI::App& app);
+Action defineMan(CLI::App& app);
 Action defineMkdir(CLI::App& app);
 Action defineMv(CLI::App& app);
 Action definePut(CLI::App& app);
