@@ -29,9 +29,16 @@ void normaliseWritten(std::u16string& text)
 /// The path as it is written behind the '!': without a '!' of its own.
 std::u16string writePath(std::u16string const& path)
 {
-    std::u16string written = network::iri::encodePath(path);
-    for (auto found = written.find(u'!'); found != std::u16string::npos; found = written.find(u'!', found))
-        written.replace(found, 1, u"%21");
+    std::u16string encoded = network::iri::encodePath(path);
+    if (encoded.find(u'!') == std::u16string::npos)
+        return encoded;
+    std::u16string written;
+    for (char16_t const unit : encoded) {
+        if (unit == u'!')
+            written += u"%21";
+        else
+            written += unit;
+    }
     return written;
 }
 
