@@ -9,6 +9,7 @@
 #include <string>
 #include <utility>
 
+#include <boost/exception/diagnostic_information.hpp>
 #include <boost/exception/info.hpp>
 
 #include <fl/filesystem/exceptions.hpp>
@@ -110,14 +111,26 @@ struct TagNote;
 
 TEST(Conversions, AnyOtherFailureIsDescribed)
 {
-    std::string const standard = otherFailure([](upath const&) -> upath { throw std::invalid_argument("odd cause"); });
-    EXPECT_NE(standard.find("odd cause"), std::string::npos);
-    EXPECT_NE(standard.find("std::invalid_argument"), std::string::npos);
+    EXPECT_EQ(otherFailure([](upath const&) -> upath { throw std::invalid_argument("odd cause"); }),
+              boost::diagnostic_information(std::invalid_argument("odd cause"), true));
 
     std::string const both = otherFailure(
         [](upath const&) -> upath { throw Described() << boost::error_info<TagNote, std::string>("a note"); });
     EXPECT_NE(both.find("described"), std::string::npos);
     EXPECT_NE(both.find("a note"), std::string::npos);
+    EXPECT_NE(both.find("Throw location unknown"), std::string::npos);
+}
+
+struct Unnamed : virtual boost::exception
+{};
+
+TEST(Conversions, FailureThatOnlyBoostKnowsIsDescribed)
+{
+    std::string const text = otherFailure(
+        [](upath const&) -> upath { throw Unnamed() << boost::error_info<TagNote, std::string>("a note"); });
+    EXPECT_NE(text.find("Throw location unknown"), std::string::npos);
+    EXPECT_NE(text.find("a note"), std::string::npos);
+    EXPECT_EQ(text.find("what"), std::string::npos);
 }
 
 TEST(Conversions, FailureThatIsNoExceptionHasNoDescription)

@@ -4,6 +4,7 @@
 #include <rapidcheck/gtest.h>
 
 #include <algorithm>
+#include <cstdint>
 #include <memory>
 #include <stdexcept>
 #include <string>
@@ -76,6 +77,8 @@ TEST(ContainerImpl, HasNoHostAndNoFilePath)
     EXPECT_EQ(textOf<std::logic_error>([&] { static_cast<void>(location.toUPath()); }),
               "Can not extract a file system path from StorageIRI s:f:/x.c!/\xC3\xA9 as it represents a location "
               "inside a container.");
+    EXPECT_EQ(textOf<std::logic_error>([&] { static_cast<void>(parsed(u"s:f:/x.c!/d/").getHost()); }),
+              "StorageIRI s:f:/x.c!/d is container based so by definition has no host.");
 }
 
 TEST(ContainerImpl, EmptyPathIsTheRoot)
@@ -133,6 +136,16 @@ TEST(ContainerImpl, InnerTextIsThatOfTheInnerIri)
     EXPECT_EQ(text(std::make_shared<UPathIRIImpl>(u"file", fl::filesystem::upath(u"/x!y"))), u"s:file:///x%21y!/d");
     EXPECT_EQ(text(std::make_shared<ContainerImpl>(IRI(u"t:f:/x!/in"))), u"s:t:f:/x!/in!/d");
     EXPECT_EQ(text(plain(u"f:/!")), u"s:f:/!!/d");
+}
+
+TEST(ContainerImpl, InnerTextIsThatOfTheIriWhereTheInnerLocationPrintsAnother)
+{
+    UPathIRIImpl const top(u"file", fl::filesystem::upath(u"/x"), u"file:///x");
+    EXPECT_EQ(top.getParent()->toString(), u"file://");
+    EXPECT_EQ(ContainerImpl(u"s", top.getParent(), u"/d").toString(), u"s:file:///!/d");
+    Pointer const inner = std::make_shared<ContainerImpl>(IRI(u"t:f:/x!/in/"));
+    EXPECT_EQ(inner->toString(), u"t:f:/x!/in");
+    EXPECT_EQ(ContainerImpl(u"s", inner, u"/d").toString(), u"s:t:f:/x!/in/!/d");
 }
 
 TEST(ContainerImpl, IsParsedFromText)
@@ -208,7 +221,9 @@ TEST(ContainerImpl, RefusesTextThatIsNone)
              {u"s:f:/x.c!%2Fd", u"Invalid container-style storage IRI 's:f:/x.c!%2Fd'. Path should begin with a '/'."},
              {u"f:/x.c", u"Invalid container-style storage IRI 'f:/x.c'. Expected to find a '!' to begin the path "
                          u"section."},
+             {u"s:rel!d", u"Invalid container-style storage IRI 's:rel!d'. Path should begin with a '/'."},
              {u"rel!/d", u"IRI 'rel!/d' is not absolute."},
+             {u"rel", u"IRI 'rel' is not absolute."},
              {u"s:rel!/d", u"IRI 'rel' is not absolute."},
              {u"s:!/d", u"IRI '' is not absolute."},
              {u"s:t:f!/d", u"Invalid container-style storage IRI 't:f'. Expected to find a '!' to begin the path "
@@ -333,7 +348,7 @@ void checkAgreement(StorageIRI const& one, StorageIRI const& other)
 RC_GTEST_PROP(ContainerImpl, BuiltAndParsedAgreeAtEveryDepth, ())
 {
     using namespace tests::support;
-    int const depth = *rc::gen::inRange(1, 4);
+    int const depth = *rc::gen::element(1, 2, 3);
     rc::Gen<StorageIRI> location = plainLocation();
     for (int i = 0; i != depth; ++i)
         location = containerLocation(location);
@@ -353,6 +368,47 @@ RC_GTEST_PROP(ContainerImpl, KeepsSchemeInnerTextAndPath, ())
         RC_ASSERT(location.getScheme() == scheme);
         RC_ASSERT(shown(location.getInnerIRI().toString()) == shown(inner.toString()));
         RC_ASSERT(shown(location.getPath()) == shown(path.value));
+    }
+}
+
+constexpr char32_t blockSize = 0x400;
+
+/// All characters of a block of code points, with '/' in the middle at most.
+std::u16string charactersFrom(char32_t first)
+{
+    std::u16string characters;
+    for (char32_t c = first; c != first + blockSize; ++c) {
+        if (c < 0xD800 || c > 0xDFFF)
+            characters += tests::support::fromCodePoint(c);
+    }
+    return characters;
+}
+
+/// Beyond U+FFFF only where the rules of IRIs change: at the ends of a plane, and at U+E1000.
+bool isWorthTesting(char32_t block)
+{
+    char32_t const inPlane = block & 0xFFFF;
+    return block < 0x10000 || inPlane == 0 || inPlane == 0x1000 || inPlane == 0x10000 - blockSize;
+}
+
+TEST(ContainerImpl, EveryCharacterComesBackFromThreeDeep)
+{
+    for (char32_t block = 0; block != 0x110000; block += blockSize) {
+        if (!isWorthTesting(block))
+            continue;
+        SCOPED_TRACE(static_cast<std::uint32_t>(block));
+        std::u16string const path = u"/" + charactersFrom(block);
+        for (StorageIRI const& plainInner :
+             {StorageIRI(u"file", fl::filesystem::upath(path, false)), StorageIRI(StorageIRI(u"f://h/"), path)})
+        {
+            StorageIRI const made(u"a", StorageIRI(u"b", StorageIRI(u"c", plainInner, path), path), path);
+            StorageIRI location(made.toString());
+            EXPECT_EQ(location, made);
+            for (; location.hasInnerIRI(); location = location.getInnerIRI())
+                EXPECT_TRUE(location.getPath() == path);
+            EXPECT_TRUE(location.getPath() == path);
+            EXPECT_EQ(location.toString(), plainInner.toString());
+        }
     }
 }
 

@@ -69,6 +69,13 @@ TEST(UPathIRIImpl, KeepsThePathAsGiven)
     }
 }
 
+TEST(UPathIRIImpl, NameIsTheLastElementOfThePathAsGiven)
+{
+    for (auto const& [path, name] : std::vector<std::pair<std::u16string, std::u16string>>{
+             {u"/a//b", u"b"}, {u"//a", u"a"}, {u"/a/", u"a"}, {u"/a//", u"a"}, {u"/./a/..", u".."}, {u"/%41", u"%41"}})
+        EXPECT_EQ(UPathIRIImpl(u"s", exact(path)).getName(), name) << shown(path);
+}
+
 TEST(UPathIRIImpl, TakesTheSchemeAsGiven)
 {
     for (std::u16string const scheme : {u"FILE", u"", u"1x", u"a b"}) {
@@ -176,6 +183,14 @@ TEST(UPathIRIImpl, ParentOfATopFolderWithATextHasTheTextOfNoPath)
     EXPECT_TRUE(parent->equals(*made(u"/a").getParent()));
 }
 
+TEST(UPathIRIImpl, ParentTakesTheTextUpToTheLastSlashWhateverThePath)
+{
+    UPathIRIImpl const child(u"s", exact(u"/a//b//c"));
+    EXPECT_EQ(child.toString(), u"s:///a//b//c");
+    EXPECT_EQ(child.getParent()->toString(), u"s:///a//b/");
+    EXPECT_EQ(child.getParent()->getPath(), u"/a/b");
+}
+
 TEST(UPathIRIImpl, ParentIsNormalised)
 {
     UPathIRIImpl const location(u"s", exact(u"/a//b//c"));
@@ -247,6 +262,16 @@ TEST(UPathIRIImpl, IsEqualByPathWhateverTheScheme)
     EXPECT_FALSE(one.equals(made(u"/a/b")));
     EXPECT_FALSE(one.equals(UPathIRIImpl(u"file", exact(u"/a/"))));
     EXPECT_FALSE(one.equals(UPathIRIImpl(u"file", exact(u"//a"))));
+}
+
+TEST(UPathIRIImpl, LocationsOfOnePathUnderTwoSchemesAreEqualAndHashApart)
+{
+    StorageIRI const one(u"file", upath(u"/a"));
+    StorageIRI const other(u"other", upath(u"/a"));
+    EXPECT_TRUE(one == other);
+    EXPECT_FALSE(one != other);
+    EXPECT_FALSE(one < other || other < one);
+    EXPECT_NE(one.hashValue(), other.hashValue());
 }
 
 TEST(UPathIRIImpl, IsEqualByTextToAnotherKind)
