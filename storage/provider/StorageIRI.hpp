@@ -39,7 +39,9 @@ public:
     /// Throws `AnonymousInternalException<std::runtime_error>` for a relative path; an empty one is accepted.
     StorageIRI(std::u16string scheme, fl::filesystem::upath path);
 
-    /// The location of `path` inside the container that stands at `inner`.
+    /// The location of the plain `path` inside the container that stands at `inner`; an empty path stands for "/".
+    /// Throws `AnonymousInternalException<std::runtime_error>` for a scheme that cannot begin an IRI and for a path
+    /// that does not begin with '/', `std::out_of_range` for a lone surrogate.
     StorageIRI(std::u16string const& scheme, StorageIRI const& inner, std::u16string path);
 
     /// A child of `base`: a relative text is joined to the path, less one trailing '/'; one that begins with '/'
@@ -80,7 +82,9 @@ public:
 
     bool isOpaque() const;
     network::IRI toIRI() const;
-    /// The canonical text; equality, order and hash rest on it.
+    /// The canonical text; equality, order and hash rest on it. Two locations of file-system paths are the exception:
+    /// their paths decide equality and order, whatever their schemes. Throws `std::range_error` for such a path that
+    /// holds a lone surrogate.
     std::u16string const& toString() const;
 
     /// The path without "." and ".." segments (RFC 3986, section 5.2.4).

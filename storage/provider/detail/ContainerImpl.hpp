@@ -13,8 +13,8 @@ class FOUNDATION_API ContainerImpl : public StorageIRIImpl
 {
 public:
     /// The location of a plain path; an empty one stands for "/". One trailing '/' is kept in the path and left out of
-    /// the text. Throws `AnonymousInternalException<std::runtime_error>` for what is no scheme and for a path that does
-    /// not begin with '/', `std::out_of_range` for a lone surrogate.
+    /// the text. Throws `AnonymousInternalException<std::runtime_error>` for a scheme that cannot begin an IRI and for
+    /// a path that does not begin with '/', `std::out_of_range` for a lone surrogate.
     ContainerImpl(std::u16string const& scheme, std::shared_ptr<StorageIRIImpl> inner, std::u16string path);
 
     /// Parses an opaque IRI. Throws `AnonymousInternalException<std::runtime_error>` for one that has no scheme, no
