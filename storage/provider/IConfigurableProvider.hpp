@@ -8,6 +8,8 @@
 namespace foundation::storage::provider {
 
 /// The base of providers that take settings after they were made; the factories hand theirs on through it.
+///
+/// A provider that is read-only as well derives from this class alone and refuses changes itself.
 class FOUNDATION_API IConfigurableProvider : public IProvider
 {
 public:

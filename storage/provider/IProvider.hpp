@@ -76,6 +76,8 @@ public:
     void createFolder(StorageIRI const& iri) const;
 
     /// Creates a folder and every missing ancestor. Those created before a failure stay; the failure names `iri`.
+    /// A root is refused with `ResourceAlreadyExists`, or `ResourceNotFound` when it is missing; with `InvalidLocation`
+    /// whatever has no existing ancestor.
     void createFolderRecursive(StorageIRI const& iri) const;
 
     bool fileExists(StorageIRI const& iri) const;
@@ -107,7 +109,8 @@ public:
     std::unique_ptr<ByteStream> openReadOnlyStream(StorageIRI const& iri) const;
 
     /// Opens a file for writing all-or-nothing: the target changes when the stream is closed with `Commit`, and then
-    /// takes the new content whole.
+    /// takes the new content whole. Throws `std::logic_error` for a location without a parent, and
+    /// `boost::uuids::entropy_error` when the system has no random bytes for the name of a scratch file.
     std::unique_ptr<TransactionalStream> openTransactionalStream(StorageIRI const& iri,
                                                                  ByteStreamOpenOptions const& options) const;
 
@@ -122,7 +125,8 @@ public:
     Listing listAllRecursive(StorageIRI const& folder, std::u16string pattern = {}) const;
     Listing listAllRecursiveNamesOnly(StorageIRI const& folder, std::u16string pattern = {}) const;
 
-    /// Copies a file within the store, not all-or-nothing: a failure may leave a partial target.
+    /// Copies a file within the store, not all-or-nothing: a failure may leave a partial target. Replaces a file with
+    /// `Overwrite` and `Clobber`, a folder never. A failure of either stream during the copy names `from`.
     void copyFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const;
 
     /// Copies a file within the store all-or-nothing, asking `interrupt` between chunks unless it is empty; see
@@ -141,6 +145,7 @@ public:
                                 EventKinds const& kinds) const;
 
     /// Stops the events of the file's parent folder, through which those of a file are published.
+    /// Throws `std::logic_error` for a location without a parent.
     void stopPublishingFileEventsFor(StorageIRI const& file) const;
     void stopPublishingFolderEventsFor(StorageIRI const& folder) const;
 
