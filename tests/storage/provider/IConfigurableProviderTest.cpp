@@ -18,6 +18,8 @@ using tests::support::ConfigurableProvider;
 static_assert(std::is_base_of_v<IProvider, IConfigurableProvider>);
 static_assert(std::is_abstract_v<IConfigurableProvider>);
 static_assert(sizeof(IConfigurableProvider) == sizeof(void*));
+static_assert(
+    requires(IProvider * base) { static_cast<IConfigurableProvider*>(base); }, "not a virtual base");
 static_assert(std::is_same_v<decltype(&IConfigurableProvider::configure), void (IConfigurableProvider::*)(ptree)>);
 
 struct Opened : IConfigurableProvider
@@ -25,6 +27,14 @@ struct Opened : IConfigurableProvider
     using IConfigurableProvider::doConfigure;
     using IProvider::doGetExtendedAttributes;
 };
+static_assert(std::is_same_v<decltype(&Opened::doConfigure), void (IConfigurableProvider::*)(ptree)>);
+
+template <class Provider>
+concept ConfiguresByTheVirtualOperation = requires(Provider& provider)
+{
+    provider.doConfigure(ptree());
+};
+static_assert(ConfiguresByTheVirtualOperation<Opened> && !ConfiguresByTheVirtualOperation<IConfigurableProvider>);
 
 TEST(IConfigurableProvider, ConfiguringIsTheSlotBehindThoseOfIProvider)
 {
@@ -34,7 +44,7 @@ TEST(IConfigurableProvider, ConfiguringIsTheSlotBehindThoseOfIProvider)
 
 ptree sampleTree()
 {
-    ptree tree;
+    ptree tree("data of the root");
     tree.put("a", 1);
     tree.put("b.c", "deep");
     return tree;

@@ -20,6 +20,8 @@ using namespace tests::support;
 static_assert(std::is_base_of_v<IProvider, IReadOnlyProvider>);
 static_assert(std::is_abstract_v<IReadOnlyProvider>);
 static_assert(sizeof(IReadOnlyProvider) == sizeof(void*));
+static_assert(
+    requires(IProvider * base) { static_cast<IReadOnlyProvider*>(base); }, "not a virtual base");
 
 /// Supplies what a read-only provider must, and counts the questions.
 class Shelf : public IReadOnlyProvider
@@ -147,6 +149,12 @@ constexpr bool isOwn(Result (Class::*)(Arguments...) const)
     return std::is_same_v<Class, IReadOnlyProvider>;
 }
 
+template <typename Class>
+constexpr bool isOwn(void (Class::*)())
+{
+    return std::is_same_v<Class, IReadOnlyProvider>;
+}
+
 // Twelve operations are refused, and no other is touched.
 struct Opened : IReadOnlyProvider
 {
@@ -157,13 +165,31 @@ struct Opened : IReadOnlyProvider
                   isOwn(&Opened::doOpenStream) && isOwn(&Opened::doCopyFile) && isOwn(&Opened::doSetLastModified) &&
                   isOwn(&Opened::doSetWritable));
     static_assert(!isOwn(&Opened::doFileExists) && !isOwn(&Opened::doFolderExists) &&
+                  !isOwn(&Opened::doGetFileAttributes) && !isOwn(&Opened::doGetFolderAttributes) &&
                   !isOwn(&Opened::doOpenReadOnlyStream) && !isOwn(&Opened::doOpenTransactionalStream) &&
-                  !isOwn(&Opened::doOpenTransactionalStreamAtScratchLocation) && !isOwn(&Opened::doCopyFileAtomic) &&
-                  !isOwn(&Opened::doPublishFileEventsFor) && !isOwn(&Opened::doPublishFolderEventsFor) &&
+                  !isOwn(&Opened::doOpenTransactionalStreamAtScratchLocation) && !isOwn(&Opened::doListAll) &&
+                  !isOwn(&Opened::doListAllWildcards) && !isOwn(&Opened::doListFiles) &&
+                  !isOwn(&Opened::doListFilesWildcards) && !isOwn(&Opened::doListFolders) &&
+                  !isOwn(&Opened::doListFoldersWildcards) && !isOwn(&Opened::doListAllNamesOnly) &&
+                  !isOwn(&Opened::doListAllNamesOnlyWildcards) && !isOwn(&Opened::doListFoldersNamesOnly) &&
+                  !isOwn(&Opened::doListFoldersNamesOnlyWildcards) && !isOwn(&Opened::doListFilesNamesOnly) &&
+                  !isOwn(&Opened::doListFilesNamesOnlyWildcards) && !isOwn(&Opened::doListAllRecursive) &&
+                  !isOwn(&Opened::doListAllRecursiveWildcards) && !isOwn(&Opened::doListAllRecursiveNamesOnly) &&
+                  !isOwn(&Opened::doListAllRecursiveNamesOnlyWildcards) && !isOwn(&Opened::doCopyFileAtomic) &&
+                  !isOwn(&Opened::doPublishFolderEventsFor) && !isOwn(&Opened::doPublishFileEventsFor) &&
                   !isOwn(&Opened::doStopPublishingEventsFor) && !isOwn(&Opened::doHasFeature) &&
-                  !isOwn(&Opened::doListAllRecursive) && !isOwn(&Opened::doExists) &&
-                  !isOwn(&Opened::doExistsExtended) && !isOwn(&Opened::doGetExtendedAttributes));
+                  !isOwn(&Opened::doGetPathComparator) && !isOwn(&Opened::doGetCanonicalLocation) &&
+                  !isOwn(&Opened::doGetFilenameSensitivity) && !isOwn(&Opened::doShutdown) &&
+                  !isOwn(&Opened::doExists) && !isOwn(&Opened::doExistsExtended) &&
+                  !isOwn(&Opened::doGetExtendedAttributes));
+    using IReadOnlyProvider::doGetExtendedAttributes;
+    virtual void next() const;
 };
+
+TEST(IReadOnlyProvider, AddsNoVirtualOperation)
+{
+    EXPECT_EQ(slotOf(&Opened::next), slotOf(&Opened::doGetExtendedAttributes) + 1);
+}
 
 } // namespace
 } // namespace foundation::storage::provider
