@@ -3,12 +3,17 @@
 #include <fl/filesystem/native_name.hpp>
 #include <fl/filesystem/upath.hpp>
 #include <fl/i18n/utf8.hpp>
-#include <storage/local/LocalProvider.hpp>
+#include <storage/registry/OpenException.hpp>
+#include <storage/registry/redactPassword.hpp>
+#include <storage/registry/registerAll.hpp>
 #include <tools/storage/Failure.hpp>
+#include <tools/storage/describe.hpp>
 
 #include <cerrno>
 #include <fmt/format.h>
 #include <memory>
+#include <new>
+#include <span>
 #include <stdlib.h>
 #include <system_error>
 #include <unistd.h>
@@ -18,6 +23,7 @@ namespace foundation::storage::tool {
 namespace {
 
 using provider::StorageIRI;
+using registry::OpenException;
 
 std::string workingDirectory()
 {
@@ -37,37 +43,68 @@ StorageIRI locationOfPath(std::string const& path)
     return StorageIRI(StorageIRI(u"file:///"), normal.string());
 }
 
-StorageIRI locationOfIRI(std::string const& text)
+/// The text of an IRI, its scheme in lower case, so that no store has two names in one command.
+std::u16string textOfIRI(std::string argument)
 {
-    try {
-        return StorageIRI(fl::i18n::from_utf8(text, fl::i18n::Malformed::Throw));
-    } catch (std::exception const& error) {
-        throw Failure{text, fmt::format("not a location: {} (for a local path, write ./{})", error.what(), text)};
-    }
+    for (char& c : std::span(argument).first(argument.find(':')))
+        c = c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+    return fl::i18n::from_utf8(argument, fl::i18n::Malformed::Throw);
 }
 
-bool isFileScheme(std::string scheme)
+/// An argument as it may be shown to whoever sees the terminal.
+std::string withoutPassword(std::string const& argument)
 {
-    for (char& c : scheme)
-        c = c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
-    return scheme == "file";
+    return fl::filesystem::to_native_bytes(registry::redactPassword(fl::filesystem::from_native_bytes(argument)));
+}
+
+std::string explain(OpenException const& error, std::string const& argument)
+{
+    std::string const scheme = fl::i18n::to_utf8(error.getStorageIRI().getScheme(), fl::i18n::Malformed::Replace);
+    switch (error.getReason()) {
+    case OpenException::Reason::UnknownScheme:
+        return fmt::format("no store serves the scheme '{}' (for a local path, write ./{})", scheme, argument);
+    case OpenException::Reason::ContainerNeedsContainer:
+        return fmt::format("'{0}' names places in a container, as in {0}:file:///container!/place", scheme);
+    case OpenException::Reason::PlainSchemeOfContainer:
+        return fmt::format("'{0}' names no places in a container: '/' follows {0}: (for a local path, write ./{1})",
+                           scheme, argument);
+    case OpenException::Reason::CredentialsInLocation:
+        break;
+    }
+    return "a location must not carry a password";
+}
+
+std::string explain(provider::Exception const& error, std::string const& argument)
+{
+    bool const isInvalid = error.getErrorCode() == provider::ErrorCode::InvalidLocation;
+    if (isInvalid && argument.find_first_of("?#") != std::string::npos)
+        return "a '?' or '#' that belongs to a name is written %3F or %23";
+    return describe(error.getErrorCode());
 }
 
 } // namespace
 
-Stores::Stores() : local_(std::make_shared<local::LocalProvider>()) {}
+Stores::Stores()
+{
+    registry::registerAll(registry_);
+}
 
 provider::StorageItem Stores::openItem(std::string const& argument) const
 {
     if (!isIRI(argument))
-        return {local_, locationOfPath(argument)};
-    std::string const scheme = argument.substr(0, argument.find(':'));
-    if (!isFileScheme(scheme))
-        throw Failure{argument,
-                      fmt::format("no store serves the scheme '{}' (for a local path, write ./{})", scheme, argument)};
-    if (argument.find_first_of("?#") != std::string::npos)
-        throw Failure{argument, "a '?' or '#' that belongs to a name is written %3F or %23"};
-    return {local_, locationOfIRI(argument)};
+        return registry_.open(locationOfPath(argument));
+    std::string const shown = withoutPassword(argument);
+    try {
+        return registry_.open(textOfIRI(argument));
+    } catch (OpenException const& error) {
+        throw Failure{shown, explain(error, shown)};
+    } catch (provider::Exception const& error) {
+        throw Failure{shown, explain(error, argument)};
+    } catch (std::bad_alloc const&) {
+        throw;
+    } catch (std::exception const& error) {
+        throw Failure{shown, fmt::format("not a location: {} (for a local path, write ./{})", error.what(), shown)};
+    }
 }
 
 } // namespace foundation::storage::tool

@@ -1,28 +1,30 @@
 #pragma once
 
-#include <storage/provider/IProvider.hpp>
 #include <storage/provider/StorageItem.hpp>
+#include <storage/registry/Registry.hpp>
 #include <tools/storage/Place.hpp>
 
-#include <memory>
 #include <string>
 
 namespace foundation::storage::tool {
 
-/// The stores that the tool can reach.
+/// The stores that the tool can reach: those that are built in.
 class Stores
 {
 public:
     Stores();
 
+    registry::Registry const& registry() const { return registry_; }
+
     /// The item that an argument names: an IRI, or a local path, relative ones taken from the working directory.
-    /// Throws `Failure` for what names nothing, and for a scheme that no store serves.
+    /// Throws `Failure` for what names nothing, for what no store serves, and for a location with a password, which
+    /// the failure does not repeat.
     provider::StorageItem openItem(std::string const& argument) const;
 
     Place open(std::string const& argument) const { return Place(openItem(argument), argument); }
 
 private:
-    std::shared_ptr<provider::IProvider> local_;
+    registry::Registry registry_;
 };
 
 } // namespace foundation::storage::tool

@@ -66,6 +66,46 @@ TEST_F(Location, WithAQueryOrFragmentSaysHowToWriteTheName)
                    "storage: ls: " + iri + ": a '?' or '#' that belongs to a name is written %3F or %23\n");
 }
 
+TEST_F(Location, MayLieInMemory)
+{
+    EXPECT_EQ(runWell({"ls", "mem:///"}), "");
+    runFailing({"ls", "mem:///a"}, "storage: ls: mem:///a: no such file or folder\n");
+}
+
+TEST_F(Location, IsCopiedFromOneStoreToAnother)
+{
+    folder.write("a", "content");
+    EXPECT_EQ(runWell({"cp", "-v", "a", "mem:///b"}), "a -> mem:///b\n");
+}
+
+TEST_F(Location, IsTheSameWhateverTheLetterCaseOfItsScheme)
+{
+    folder.write("a", "content");
+    runFailing({"cp", "--replace", "a", "FILE://" + folder.path().native() + "/a"},
+               "storage: cp: a: source and target are the same\n");
+}
+
+TEST_F(Location, OfASchemeWithoutContainersSaysSo)
+{
+    runFailing({"cat", "file:b"}, "storage: cat: file:b: 'file' names no places in a container: '/' follows file: (for "
+                                  "a local path, write ./file:b)\n");
+    runFailing({"cat", "mem:file:///a!/b"}, "storage: cat: mem:file:///a!/b: 'mem' names no places in a container: '/' "
+                                            "follows mem: (for a local path, write ./mem:file:///a!/b)\n");
+}
+
+TEST_F(Location, WithAPasswordIsRefusedAndDoesNotShowIt)
+{
+    for (std::string const scheme : {"mem", "other", "MEM"})
+        runFailing({"cat", scheme + "://me:canary@h/x"},
+                   "storage: cat: " + scheme + "://me:***@h/x: a location must not carry a password\n");
+    for (std::string const iri : {"mem://me:canary@h:99999/", "mem://me:canary@h/\xff", "zip:mem://me:canary@h/a"}) {
+        ProgramResult const result = run({"cat", iri});
+        EXPECT_EQ(result.status, 1);
+        EXPECT_NE(result.errors.find("me:***@h"), std::string::npos) << result.errors;
+        EXPECT_EQ(result.errors.find("canary"), std::string::npos) << result.errors;
+    }
+}
+
 TEST_F(Location, ThatIsNotUtf8IsRefusedAsAnIRI)
 {
     ProgramResult const result = run({"ls", "file:///\xff"});

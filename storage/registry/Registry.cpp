@@ -1,0 +1,291 @@
+#include <storage/registry/Registry.hpp>
+
+#include <fl/i18n/utf8.hpp>
+#include <storage/registry/FactoryException.hpp>
+#include <storage/registry/OpenException.hpp>
+#include <storage/registry/detail/schemeText.hpp>
+#include <storage/registry/redactPassword.hpp>
+
+#include <algorithm>
+#include <exception>
+#include <new>
+#include <stdexcept>
+#include <utility>
+
+namespace foundation::storage::registry {
+
+using namespace provider;
+using boost::property_tree::ptree;
+using Reason = OpenException::Reason;
+
+namespace {
+
+[[noreturn]] void throwInvalid(std::string const& scheme, char const* complaint)
+{
+    throw std::invalid_argument("The scheme \"" + scheme + "\" " + complaint + ".");
+}
+
+SchemeKind kindOf(StorageIRI const& location)
+{
+    return location.hasInnerIRI() ? SchemeKind::Container : SchemeKind::Physical;
+}
+
+Reason reasonAgainst(SchemeKind asked)
+{
+    return asked == SchemeKind::Physical ? Reason::ContainerNeedsContainer : Reason::PlainSchemeOfContainer;
+}
+
+StorageIRI rootOf(std::u16string_view scheme)
+{
+    return StorageIRI(std::u16string(scheme) + u":/");
+}
+
+/// Throws what is left of the exception in flight when nothing that it says may be repeated.
+[[noreturn]] void rethrowWithoutWords(StorageIRI const& location)
+{
+    try {
+        throw;
+    } catch (Exception const& error) {
+        throw FactoryException(error.getErrorCode(), location);
+    } catch (std::bad_alloc const&) {
+        throw std::bad_alloc();
+    } catch (...) {
+        throw FactoryException(ErrorCode::Unknown, location);
+    }
+}
+
+/// Calls `action`; `hasSettings` is asked only after a failure, and so knows of settings that came meanwhile.
+template <typename HasSettings, typename Action>
+auto withholdingSettings(StorageIRI const& location, HasSettings const& hasSettings, Action const& action)
+{
+    try {
+        return action();
+    } catch (...) {
+        if (!hasSettings())
+            throw;
+        rethrowWithoutWords(location);
+    }
+}
+
+/// Does something for several factories in turn, and throws the first failure at the end.
+class Visit
+{
+public:
+    template <typename Action>
+    void attempt(Action const& action)
+    {
+        try {
+            action();
+        } catch (...) {
+            if (!first_)
+                first_ = std::current_exception();
+        }
+    }
+
+    void finish() const
+    {
+        if (first_)
+            std::rethrow_exception(first_);
+    }
+
+private:
+    std::exception_ptr first_;
+};
+
+std::shared_ptr<IProvider> requireProvider(std::shared_ptr<IProvider> provider, StorageIRI const& location)
+{
+    if (provider == nullptr)
+        throw Exception(ErrorCode::InternalError, location);
+    return provider;
+}
+
+/// The provider of a container's inside, which need not hold the container by itself, and goes before it.
+struct Inside
+{
+    StorageItem container;
+    std::shared_ptr<IProvider> provider;
+};
+
+std::shared_ptr<IProvider> keepingContainer(std::shared_ptr<IProvider> provider, StorageItem const& container)
+{
+    auto const inside = std::make_shared<Inside>(Inside{container, std::move(provider)});
+    return std::shared_ptr<IProvider>(inside, inside->provider.get());
+}
+
+} // namespace
+
+Registry::Registry() = default;
+
+Registry::~Registry() = default;
+
+SchemeKind Registry::Entry::kind() const
+{
+    return std::holds_alternative<Physical>(factory) ? SchemeKind::Physical : SchemeKind::Container;
+}
+
+void Registry::add(std::u16string const& scheme, std::shared_ptr<PhysicalProviderFactory> factory)
+{
+    addFactory(scheme, std::move(factory));
+}
+
+void Registry::add(std::u16string const& scheme, std::shared_ptr<ContainerProviderFactory> factory)
+{
+    addFactory(scheme, std::move(factory));
+}
+
+void Registry::addFactory(std::u16string const& scheme, Factory factory)
+{
+    if (!detail::isScheme(scheme))
+        throwInvalid(fl::i18n::to_utf8(scheme, fl::i18n::Malformed::Replace), "is malformed");
+    if (std::visit([](auto const& pointer) { return pointer == nullptr; }, factory))
+        throwInvalid(fl::i18n::to_utf8(scheme, fl::i18n::Malformed::Replace), "comes without a factory");
+    if (!entries_.try_emplace(detail::lowerCased(scheme), std::move(factory)).second)
+        throwInvalid(fl::i18n::to_utf8(scheme, fl::i18n::Malformed::Replace), "is served already");
+}
+
+StorageItem Registry::open(std::u16string const& text) const
+{
+    refusePassword(text);
+    return open(parse(text));
+}
+
+StorageItem Registry::open(StorageIRI const& location) const
+{
+    refusePassword(location.toString());
+    std::vector<Level> const levels = levelsOf(location);
+    Level const& store = levels.back();
+    auto const hasSettings = [&] { return store.entry.hasSettings.load(); };
+    StorageItem item = withholdingSettings(store.location, hasSettings, [&] {
+        auto const& factory = std::get<Physical>(store.entry.factory);
+        return StorageItem(requireProvider(factory->buildProvider(store.location), store.location), store.location);
+    });
+    for (auto level = levels.rbegin() + 1; level != levels.rend(); ++level) {
+        item = withholdingSettings(level->location, hasSettings, [&] {
+            auto const& factory = std::get<Container>(level->entry.factory);
+            return StorageItem(keepingContainer(requireProvider(factory->buildProvider(item), level->location), item),
+                               level->location);
+        });
+    }
+    return item;
+}
+
+void Registry::refusePassword(std::u16string const& text) const
+{
+    if (hasPassword(text))
+        throw OpenException(Reason::CredentialsInLocation, parse(redactPassword(text)));
+}
+
+StorageIRI Registry::parse(std::u16string const& text) const
+{
+    try {
+        return StorageIRI(text);
+    } catch (std::exception const&) {
+        requireServedSchemes(text);
+        throw;
+    }
+}
+
+/// Follows a text that is no location as far as schemes go, to say of "a:b" what helps, which is not that a '!' is
+/// missing.
+void Registry::requireServedSchemes(std::u16string_view text) const
+{
+    while (auto const scheme = detail::schemeOf(text)) {
+        text.remove_prefix(scheme->size() + 1);
+        SchemeKind const kind = text.starts_with(u'/') ? SchemeKind::Physical : SchemeKind::Container;
+        find(*scheme, kind, rootOf(*scheme));
+        if (kind == SchemeKind::Physical)
+            return;
+    }
+}
+
+/// From the outside in, as the text reads.
+std::vector<Registry::Level> Registry::levelsOf(StorageIRI const& location) const
+{
+    std::vector<Level> levels;
+    for (StorageIRI place = location;; place = place.getInnerIRI()) {
+        levels.push_back({place, find(place.getScheme(), kindOf(place), place)});
+        if (!place.hasInnerIRI())
+            return levels;
+    }
+}
+
+Registry::Entry const& Registry::find(std::u16string_view scheme, SchemeKind kind, StorageIRI const& location) const
+{
+    auto const found = entries_.find(detail::lowerCased(scheme));
+    if (found == entries_.end())
+        throw OpenException(Reason::UnknownScheme, location);
+    if (found->second.kind() != kind)
+        throw OpenException(reasonAgainst(kind), location);
+    return found->second;
+}
+
+std::vector<Scheme> Registry::schemes() const
+{
+    std::vector<Scheme> schemes;
+    for (auto const& [name, entry] : entries_)
+        schemes.push_back({name, entry.kind()});
+    return schemes;
+}
+
+void Registry::configure(ptree const& settings)
+{
+    std::map<std::u16string, ptree const*> parts;
+    for (auto const& [key, part] : settings) {
+        if (!parts.try_emplace(requireConfigurable(key), &part).second)
+            throwInvalid(key, "has settings twice");
+    }
+    Visit visit;
+    for (auto const& part : parts)
+        visit.attempt([&] { configureScheme(part.first, *part.second); });
+    visit.finish();
+}
+
+void Registry::configureScheme(std::u16string const& scheme, ptree const& settings)
+{
+    Entry& entry = entries_.at(scheme);
+    entry.hasSettings = true;
+    withholdingSettings(
+        rootOf(scheme), [] { return true; }, [&] { std::get<Physical>(entry.factory)->configure(settings); });
+}
+
+/// Answers the scheme that a key of the settings means.
+std::u16string const& Registry::requireConfigurable(std::string const& key) const
+{
+    auto const found = entries_.find(detail::lowerCased(fl::i18n::from_utf8(key, fl::i18n::Malformed::Replace)));
+    if (found == entries_.end())
+        throwInvalid(key, "has settings, but nothing serves it");
+    auto const& [scheme, entry] = *found;
+    if (entry.kind() == SchemeKind::Container)
+        throwInvalid(key, "has settings, which schemes of containers do not take");
+    return scheme;
+}
+
+void Registry::shutdown()
+{
+    Visit visit;
+    for (SchemeKind const kind : {SchemeKind::Container, SchemeKind::Physical}) {
+        for (auto const& served : entries_) {
+            if (served.second.kind() == kind)
+                visit.attempt([&] { shutdownScheme(served.first, served.second); });
+        }
+    }
+    visit.finish();
+}
+
+void Registry::shutdownScheme(std::u16string const& scheme, Entry const& entry)
+{
+    withholdingSettings(
+        rootOf(scheme), [&] { return mayRepeatSettings(entry); },
+        [&] { std::visit([](auto const& factory) { factory->shutdownProvider(); }, entry.factory); });
+}
+
+/// Containers may lie in any store, and pass on what it says.
+bool Registry::mayRepeatSettings(Entry const& entry) const
+{
+    if (entry.kind() == SchemeKind::Physical)
+        return entry.hasSettings;
+    return std::any_of(entries_.begin(), entries_.end(),
+                       [](auto const& served) { return served.second.hasSettings.load(); });
+}
+
+} // namespace foundation::storage::registry

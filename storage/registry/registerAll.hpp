@@ -1,0 +1,12 @@
+#pragma once
+
+#include <foundation/export.hpp>
+#include <storage/registry/Registry.hpp>
+
+namespace foundation::storage::registry {
+
+/// Adds every provider that is built in: `file` and `mem`.
+/// Throws `std::invalid_argument` when one of their schemes is taken; those before it are added then.
+FOUNDATION_API void registerAll(Registry& registry);
+
+} // namespace foundation::storage::registry
