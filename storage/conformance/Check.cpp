@@ -32,12 +32,22 @@ std::vector<Check> const& allChecks()
     return checks;
 }
 
-std::vector<Check> checksFor(Harness const& harness)
+std::vector<Check> copyChecks(Harness const& source)
 {
-    std::vector<Check> checks;
-    std::copy_if(allChecks().begin(), allChecks().end(), std::back_inserter(checks),
+    std::vector<Check> all;
+    for (auto const family : detail::copyFamilies) {
+        std::vector<Check> checks = family(source);
+        std::move(checks.begin(), checks.end(), std::back_inserter(all));
+    }
+    return all;
+}
+
+std::vector<Check> applicable(std::vector<Check> const& checks, Harness const& harness)
+{
+    std::vector<Check> some;
+    std::copy_if(checks.begin(), checks.end(), std::back_inserter(some),
                  [&](Check const& check) { return check.applies(harness); });
-    return checks;
+    return some;
 }
 
 void run(Check const& check, Harness const& harness)

@@ -16,17 +16,20 @@ struct Check
     std::string name;
 
     /// Makes a place of its own, uses the provider there, and reports each broken promise as a GoogleTest failure.
-    void (*run)(Harness const& harness);
+    std::function<void(Harness const& harness)> run;
 
     /// Whether the promise is one that the provider of this harness gives.
     std::function<bool(Harness const& harness)> applies;
 };
 
-/// Every check of the kit, in families.
+/// Every check of a provider, in families.
 FOUNDATION_API std::vector<Check> const& allChecks();
 
-/// The checks that apply to a provider.
-FOUNDATION_API std::vector<Check> checksFor(Harness const& harness);
+/// Every check of copies from the provider of `source`; to be run with the provider that is copied to.
+FOUNDATION_API std::vector<Check> copyChecks(Harness const& source);
+
+/// Those of `checks` that apply to a provider.
+FOUNDATION_API std::vector<Check> applicable(std::vector<Check> const& checks, Harness const& harness);
 
 /// Runs a check, and turns what it throws into a failure too.
 FOUNDATION_API void run(Check const& check, Harness const& harness);

@@ -26,16 +26,26 @@ private:
     std::shared_ptr<Harness const> harness_;
 };
 
+std::size_t registerApplicable(std::string const& name, std::vector<Check> const& checks, Harness const& harness)
+{
+    auto const shared = std::make_shared<Harness const>(harness);
+    std::vector<Check> const some = applicable(checks, harness);
+    for (Check const& check : some)
+        testing::RegisterTest((name + '/' + check.family).c_str(), check.name.c_str(), nullptr, nullptr, __FILE__,
+                              __LINE__, [=]() -> testing::Test* { return new ConformanceTest(check, shared); });
+    return some.size();
+}
+
 } // namespace
 
 std::size_t registerConformance(std::string const& provider, Harness const& harness)
 {
-    auto const shared = std::make_shared<Harness const>(harness);
-    std::vector<Check> const checks = checksFor(harness);
-    for (Check const& check : checks)
-        testing::RegisterTest((provider + '/' + check.family).c_str(), check.name.c_str(), nullptr, nullptr, __FILE__,
-                              __LINE__, [=]() -> testing::Test* { return new ConformanceTest(check, shared); });
-    return checks.size();
+    return registerApplicable(provider, allChecks(), harness);
+}
+
+std::size_t registerCopyConformance(std::string const& pair, Harness const& source, Harness const& destination)
+{
+    return registerApplicable(pair, copyChecks(source), destination);
 }
 
 } // namespace foundation::storage::conformance

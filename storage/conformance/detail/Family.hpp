@@ -18,6 +18,13 @@ struct NamedFunction
     void (*run)(Harness const& harness);
 };
 
+/// The name of a check: that of its function, with a capital.
+inline std::string checkName(std::string function)
+{
+    function[0] = static_cast<char>(std::toupper(static_cast<unsigned char>(function[0])));
+    return function;
+}
+
 /// Writes the table of a family: which checks there are, and for which providers.
 class Family
 {
@@ -56,11 +63,8 @@ public:
 private:
     Family& add(std::initializer_list<NamedFunction> functions, std::function<bool(Harness const&)> const& applies)
     {
-        for (NamedFunction const& function : functions) {
-            std::string name = function.name;
-            name[0] = static_cast<char>(std::toupper(static_cast<unsigned char>(name[0])));
-            checks_.push_back({name_, std::move(name), function.run, applies});
-        }
+        for (NamedFunction const& function : functions)
+            checks_.push_back({name_, checkName(function.name), function.run, applies});
         return *this;
     }
 

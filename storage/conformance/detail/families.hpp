@@ -24,12 +24,25 @@ std::vector<Check> atomicCopyChecks();
 std::vector<Check> changeEventChecks();
 std::vector<Check> concurrencyChecks();
 std::vector<Check> readOnlyChecks();
+std::vector<Check> itemCopyChecks();
 
 /// Each family stands in a file of its own in suites/.
 inline constexpr std::vector<Check> (*families[])() = {
-    creationChecks,   existenceChecks, removalChecks,     attributesChecks,  locationChecks,    nameChecks,
-    listingChecks,    patternChecks,   openOptionsChecks, streamChecks,      transactionChecks, moveFileChecks,
-    moveFolderChecks, copyFileChecks,  atomicCopyChecks,  changeEventChecks, concurrencyChecks, readOnlyChecks,
+    creationChecks,    existenceChecks,   removalChecks,    attributesChecks,  locationChecks,
+    nameChecks,        listingChecks,     patternChecks,    openOptionsChecks, streamChecks,
+    transactionChecks, moveFileChecks,    moveFolderChecks, copyFileChecks,    atomicCopyChecks,
+    changeEventChecks, concurrencyChecks, readOnlyChecks,   itemCopyChecks,
+};
+
+std::vector<Check> copyPolicyChecks(Harness const& source);
+std::vector<Check> copyInterruptionChecks(Harness const& source);
+std::vector<Check> copyFaultChecks(Harness const& source);
+std::vector<Check> copyStreamChecks(Harness const& source);
+std::vector<Check> copyConcurrencyChecks(Harness const& source);
+
+/// The same for copies from one provider to another.
+inline constexpr std::vector<Check> (*copyFamilies[])(Harness const& source) = {
+    copyPolicyChecks, copyInterruptionChecks, copyFaultChecks, copyStreamChecks, copyConcurrencyChecks,
 };
 
 } // namespace foundation::storage::conformance::detail

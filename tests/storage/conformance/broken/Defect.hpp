@@ -26,6 +26,9 @@ struct Defect
 
     /// For what a misbehaviour cannot say.
     std::shared_ptr<IProvider> (*wrap)(std::shared_ptr<IProvider> sound) = nullptr;
+
+    /// Of a copy from one provider to another the source is broken, and not the destination.
+    bool asSource = false;
 };
 
 Harness brokenHarness(Defect const& defect);
@@ -44,6 +47,7 @@ std::vector<Table> streamDefects();
 std::vector<Table> transactionDefects();
 std::vector<Table> moveDefects();
 std::vector<Table> copyDefects();
+std::vector<Table> copyBetweenDefects();
 std::vector<Table> otherDefects();
 
 } // namespace foundation::storage::conformance::broken

@@ -3,6 +3,7 @@
 #include <tests/support/VectorListing.hpp>
 
 #include <algorithm>
+#include <thread>
 #include <utility>
 
 namespace foundation::storage::conformance::broken {
@@ -221,7 +222,29 @@ private:
     Misbehaviour const m;
 };
 
+/// Serves the thread that made it alone.
+class OfOneThread final : public ForwardingProvider
+{
+public:
+    using ForwardingProvider::ForwardingProvider;
+
+protected:
+    void before(char const*, Iri location) const override
+    {
+        if (std::this_thread::get_id() != owner_)
+            throw Exception(ErrorCode::InternalError, location);
+    }
+
+private:
+    std::thread::id const owner_ = std::this_thread::get_id();
+};
+
 } // namespace
+
+std::shared_ptr<IProvider> servingOneThread(std::shared_ptr<IProvider> sound)
+{
+    return std::make_shared<OfOneThread>(std::move(sound));
+}
 
 std::shared_ptr<IProvider> misbehaving(std::shared_ptr<IProvider> sound, Misbehaviour const& misbehaviour)
 {
@@ -261,6 +284,11 @@ StorageIRI sibling(Iri iri, std::u16string const& name)
 bool preserves(Policy policy)
 {
     return policy == Policy::Preserve || policy == Policy::NoClobber;
+}
+
+long withoutTheLastByte(ByteStream& stream, char const* data, long count)
+{
+    return count == 0 ? stream.write(data, 0) : stream.write(data, count - 1) + 1;
 }
 
 std::vector<FolderEntry> entriesOf(Listing const& listing)

@@ -15,6 +15,7 @@ using namespace provider;
 using Store = IProvider const&;
 using Iri = StorageIRI const&;
 using Policy = ReplacementPolicy;
+using Options = ByteStreamOpenOptions;
 using Kinds = IProvider::EventKinds const&;
 using Bytes = std::unique_ptr<ByteStream>;
 using Transaction = std::unique_ptr<TransactionalStream>;
@@ -83,6 +84,9 @@ struct Misbehaviour
 
 std::shared_ptr<IProvider> misbehaving(std::shared_ptr<IProvider> sound, Misbehaviour const& misbehaviour);
 
+/// A provider that serves no thread but the one that makes it.
+std::shared_ptr<IProvider> servingOneThread(std::shared_ptr<IProvider> sound);
+
 /// The failure of `action` with another code.
 template <typename Action>
 auto miscoded(Action const& action, ErrorCode code)
@@ -104,6 +108,9 @@ auto misplaced(Action const& action, Iri location)
         throw Exception(error.getErrorCode(), location);
     }
 }
+
+/// Writes all but the last byte, and says that it wrote it.
+long withoutTheLastByte(ByteStream& stream, char const* data, long count);
 
 /// Does `action`, and does not tell that it failed.
 template <typename Action>

@@ -1,8 +1,8 @@
 // What can be wrong with change events, with use by many threads, and with refusing to write.
 
 #include <storage/provider/ChangeEventExceptions.hpp>
-#include <storage/provider/StreamClosePolicy.hpp>
 #include <tests/storage/conformance/broken/Defect.hpp>
+#include <tests/storage/conformance/broken/brokenTransactions.hpp>
 
 #include <atomic>
 #include <thread>
@@ -14,7 +14,6 @@ namespace {
 
 using events::EntryType;
 using events::Kind;
-using Options = ByteStreamOpenOptions;
 
 /// Tells files as folders and folders as files.
 void swappingTypes(Store s, Iri i, ChangeEventCallback const& callback, Kinds kinds)
@@ -88,23 +87,6 @@ Table changeEvents()
               plainHarness}}};
 }
 
-/// Serves the thread that made it alone.
-class OfOneThread final : public ForwardingProvider
-{
-public:
-    using ForwardingProvider::ForwardingProvider;
-
-protected:
-    void before(char const*, Iri location) const override
-    {
-        if (std::this_thread::get_id() != owner_)
-            throw Exception(ErrorCode::InternalError, location);
-    }
-
-private:
-    std::thread::id const owner_ = std::this_thread::get_id();
-};
-
 /// Loses sight of a file for a moment after it was replaced.
 class LosesSight final : public ForwardingProvider
 {
@@ -133,32 +115,6 @@ std::shared_ptr<IProvider> wrappedIn(std::shared_ptr<IProvider> sound)
     return std::make_shared<Provider>(std::move(sound));
 }
 
-long withoutTheLastByte(ByteStream& stream, char const* data, long count)
-{
-    return stream.write(data, count - 1) + 1;
-}
-
-Transaction addingAByte(Store s, Iri i, Options o)
-{
-    class AddingAByte final : public TransactionalStream
-    {
-    public:
-        explicit AddingAByte(Transaction sound) : sound_(std::move(sound)) {}
-
-    protected:
-        ByteStream* doByteStream() override { return sound_->byteStream(); }
-        void doClose(StreamClosePolicy const& policy) override
-        {
-            sound_->write("?", 1);
-            sound_->close(policy);
-        }
-
-    private:
-        Transaction sound_;
-    };
-    return std::make_unique<AddingAByte>(s.openTransactionalStream(i, o));
-}
-
 Listing withoutTheFirst(ListingCall const& call)
 {
     Listing listing = call.answer();
@@ -171,8 +127,8 @@ Table concurrency()
 {
     return {
         "Concurrency",
-        {{.check = "ThreadsReadOneFile", .name = "ServesOneThread", .wrap = wrappedIn<OfOneThread>},
-         {.check = "ThreadsDoNotDisturbEachOther", .name = "ServesOneThread", .wrap = wrappedIn<OfOneThread>},
+        {{.check = "ThreadsReadOneFile", .name = "ServesOneThread", .wrap = servingOneThread},
+         {.check = "ThreadsDoNotDisturbEachOther", .name = "ServesOneThread", .wrap = servingOneThread},
          {"OneThreadCreatesAName",
           "LetsAllCreateIt",
           {.createFile = [](Store s, Iri i) { swallowed([&] { s.createFile(i); }); }}},

@@ -10,8 +10,6 @@ namespace foundation::storage::conformance::broken {
 
 namespace {
 
-using Options = ByteStreamOpenOptions;
-
 Table openOptions()
 {
     return {"OpenOptions",
@@ -196,9 +194,7 @@ Table streams()
                [](Store s, Iri i) {
                    return miscoded([&] { return s.openReadOnlyStream(i); }, ErrorCode::InvalidLocation);
                }}},
-         {"WhatWasWrittenIsThereAfterClosing",
-          "LosesTheLastByte",
-          {.write = [](ByteStream& s, char const* data, long count) { return s.write(data, count - 1) + 1; }}},
+         {"WhatWasWrittenIsThereAfterClosing", "LosesTheLastByte", {.write = withoutTheLastByte}},
          {"ClosingAgainDoesNothing",
           "FailsTheSecondTime",
           {.close =

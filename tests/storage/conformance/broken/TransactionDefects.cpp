@@ -3,6 +3,7 @@
 #include <storage/provider/StreamClosePolicy.hpp>
 #include <storage/provider/detail/GenericTransactionalStream.hpp>
 #include <tests/storage/conformance/broken/Defect.hpp>
+#include <tests/storage/conformance/broken/brokenTransactions.hpp>
 
 #include <utility>
 
@@ -10,7 +11,6 @@ namespace foundation::storage::conformance::broken {
 
 namespace {
 
-using Options = ByteStreamOpenOptions;
 using Composed = provider::detail::GenericTransactionalStream<ByteStream>;
 
 /// A transaction over another one that ends it in its own way.
@@ -51,6 +51,19 @@ public:
 
 protected:
     void doClose(StreamClosePolicy const&) override { sound().close(StreamClosePolicy::Abort); }
+};
+
+class AddsAByte final : public WrappedTransaction
+{
+public:
+    using WrappedTransaction::WrappedTransaction;
+
+protected:
+    void doClose(StreamClosePolicy const& policy) override
+    {
+        sound().write("?", 1);
+        sound().close(policy);
+    }
 };
 
 class SkipsEmptyCommits final : public WrappedTransaction
@@ -120,11 +133,6 @@ Transaction composed(Store s, Iri scratch, Options o, std::function<void(StreamC
     return std::make_unique<Composed>(s.openStream(scratch, o), std::move(finisher));
 }
 
-Transaction inPlace(Store s, Iri i, Options o)
-{
-    return composed(s, i, o, [](StreamClosePolicy const&) {});
-}
-
 Transaction publishedEarly(Store s, Iri i, Options o)
 {
     swallowed([&] { s.createFile(i); });
@@ -148,15 +156,6 @@ Transaction copiedAtTheEnd(Store s, Iri i, Options o)
         if (policy == StreamClosePolicy::Commit)
             copyInPlace(s, scratch, i, 1 << 20);
         s.removeFile(scratch);
-    });
-}
-
-Transaction litteringWhenAborted(Store s, Iri i, Options o)
-{
-    StorageIRI const scratch = sibling(i, i.getName() + u".tmp.bak");
-    return composed(s, scratch, o, [&s, i, scratch](StreamClosePolicy const& policy) {
-        if (policy == StreamClosePolicy::Commit)
-            s.moveFile(scratch, i, Policy::Overwrite);
     });
 }
 
@@ -186,6 +185,39 @@ Transaction takenBack(Store s, Iri i, Options o)
     return std::make_unique<TakenBack>(s.openTransactionalStream(i, o), s, i);
 }
 
+} // namespace
+
+Transaction committingOnDrop(Store s, Iri i, Options o)
+{
+    return wrapped<CommitsOnDrop>(s, i, o);
+}
+
+Transaction committingOnAbort(Store s, Iri i, Options o)
+{
+    return wrapped<CommitsOnAbort>(s, i, o);
+}
+
+Transaction addingAByte(Store s, Iri i, Options o)
+{
+    return wrapped<AddsAByte>(s, i, o);
+}
+
+Transaction writingInPlace(Store s, Iri i, Options o)
+{
+    return composed(s, i, o, [](StreamClosePolicy const&) {});
+}
+
+Transaction litteringWhenAborted(Store s, Iri i, Options o)
+{
+    StorageIRI const scratch = sibling(i, i.getName() + u".tmp.bak");
+    return composed(s, scratch, o, [&s, i, scratch](StreamClosePolicy const& policy) {
+        if (policy == StreamClosePolicy::Commit)
+            s.moveFile(scratch, i, Policy::Overwrite);
+    });
+}
+
+namespace {
+
 Misbehaviour opening(Transaction (*open)(Store, Iri, Options))
 {
     return {.openTransactionalStream = open};
@@ -195,16 +227,17 @@ Table transactions()
 {
     return {"Transactions",
             {{"CommitMakesAMissingFile", "PublishesBeforeTheCommit", opening(publishedEarly)},
-             {"CommitReplacesTheContentWhole", "WritesInPlace", opening(inPlace)},
+             {"CommitReplacesTheContentWhole", "WritesInPlace", opening(writingInPlace)},
              {"CommitOfNothingLeavesAnEmptyFile", "SkipsEmptyCommits", opening(wrapped<SkipsEmptyCommits>)},
              {"CommitReplacesWhateverTheOptionsSay", "AppendsToTheOldContent", opening([](Store s, Iri i, Options o) {
-                  return o.append == ByteStreamAppend::Append ? inPlace(s, i, o) : s.openTransactionalStream(i, o);
+                  return o.append == ByteStreamAppend::Append ? writingInPlace(s, i, o)
+                                                              : s.openTransactionalStream(i, o);
               })},
-             {"AbortChangesNothing", "CommitsOnAbort", opening(wrapped<CommitsOnAbort>)},
+             {"AbortChangesNothing", "CommitsOnAbort", opening(committingOnAbort)},
              {"AbortChangesNothing", "LeavesItsScratchFile", opening(litteringWhenAborted)},
-             {"DroppingChangesNothing", "CommitsOnDrop", opening(wrapped<CommitsOnDrop>)},
+             {"DroppingChangesNothing", "CommitsOnDrop", opening(committingOnDrop)},
              {"DroppingChangesNothing", "LeavesItsScratchFile", opening(litteringWhenAborted)},
-             {"AnExceptionChangesNothing", "CommitsOnDrop", opening(wrapped<CommitsOnDrop>)},
+             {"AnExceptionChangesNothing", "CommitsOnDrop", opening(committingOnDrop)},
              {"TheFirstCloseDecides", "LetsAnAbortTakeBackTheCommit", opening(takenBack)},
              {"WhatIsWrittenCanBeReadBack", "OpensForWritingAlone", opening([](Store s, Iri i, Options o) {
                   o.access = ByteStreamAccess::WriteOnly;
