@@ -17,6 +17,7 @@ Action defineMkdir(CLI::App& app);
 Action defineMv(CLI::App& app);
 Action definePut(CLI::App& app);
 Action defineRm(CLI::App& app);
+Action defineSchemes(CLI::App& app);
 Action defineStat(CLI::App& app);
 Action defineTree(CLI::App& app);
 

@@ -181,6 +181,11 @@ TEST_F(Find, PrintsIRIsBelowAnIRI)
     EXPECT_EQ(runWell({"find", root}), root + '\n' + root + "/b%20c\n");
 }
 
+TEST_F(Find, LooksThroughAnyStore)
+{
+    EXPECT_EQ(runWell({"find", "mem:///"}), "mem:///\n");
+}
+
 TEST_F(Find, PrintsOneJSONObjectALine)
 {
     folder.write("a", "12345");

@@ -88,6 +88,13 @@ TEST_F(Put, TakesAnIRI)
     EXPECT_EQ(folder.read("a b"), "content");
 }
 
+TEST_F(Put, WritesToAnyStore)
+{
+    putWell("content", {"put", "mem:///a"});
+    putWell("content", {"put", "--in-place", "mem:///a"});
+    putFailing({"put", "mem:///a/b"}, "storage: put: mem:///a/b: there is no folder to hold it\n");
+}
+
 TEST_F(Put, ReplacesNothingUnlessAsked)
 {
     folder.write("a", "old");
