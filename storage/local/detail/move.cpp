@@ -131,12 +131,21 @@ int moveFileWithoutReplacing(Move const& move)
     return lacksNoReplace(error) ? moveFileBySecondName(move) : error;
 }
 
+/// Renamed over that file the link would lead to itself, and the content be lost.
+bool isLinkTo(Status const& target, Move const& move, Status const& source)
+{
+    Status followed;
+    return isLink(source) && getStatus(move.fromPath, Links::Follow, followed) == 0 && isSameFile(followed, target);
+}
+
 int moveFileReplacing(Move const& move, Status const& source)
 {
     Status target;
     bool const exists = getStatus(move.toPath, Links::Keep, target) == 0;
     if (exists && isSameFile(source, target))
         return moveBetweenNames(move);
+    if (exists && !isFolder(target) && isLinkTo(target, move, source))
+        return removeName(move.fromPath);
     if (exists && leadsToFolder(move.toPath))
         return EEXIST;
     int const error = renameEntry(move.fromPath, move.toPath, 0);

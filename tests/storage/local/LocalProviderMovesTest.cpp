@@ -246,6 +246,19 @@ TEST_P(LocalProviderMoves, AFileOntoAnotherNameOfIts)
     }
 }
 
+TEST_P(LocalProviderMoves, ALinkOntoWhatItLeadsToWithoutLosingThat)
+{
+    fs::create_symlink("link to file", folder / "link to link");
+    for (std::u16string const name : {u"link to link", u"link to file"}) {
+        EXPECT_EQ(moveFile(name, u"file", GetParam()),
+                  isReplacing(GetParam()) ? moved : failure(ErrorCode::ResourceAlreadyExists, at(u"file")));
+        EXPECT_EQ(folder.read("file"), "old");
+        EXPECT_TRUE(fs::is_regular_file(fs::symlink_status(folder / "file")));
+    }
+    EXPECT_EQ(isThere("link to file"), !isReplacing(GetParam()));
+    EXPECT_EQ(isThere("link to link"), !isReplacing(GetParam()));
+}
+
 /// As a file system answers that has no way to rename without replacing.
 int renameWithoutFlags(int fromFolder, char const* from, int toFolder, char const* to, unsigned flags)
 {
