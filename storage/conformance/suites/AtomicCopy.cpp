@@ -124,6 +124,22 @@ void ontoItselfChangesNothing(Harness const& harness)
     }
 }
 
+void ontoAnotherNameKeepsTheContent(Harness const& harness)
+{
+    Tree const content{{u"file", "content"}, {u"second", "content"}, {u"link", "content"}};
+    for (auto const* const from : {u"file", u"second", u"link"})
+        for (auto const* const to : {u"file", u"second", u"link"}) {
+            SCOPED_TRACE(testing::Message() << testing::PrintToString(std::u16string(from)) << " onto "
+                                            << testing::PrintToString(std::u16string(to)));
+            Scene const scene(harness, {{u"file", "content"}});
+            harness.makers.secondName(scene.iri(u"second"), scene.iri(u"file"));
+            harness.makers.symbolicLink(scene.iri(u"link"), scene.iri(u"file"));
+            EXPECT_EQ(scene.provider().copyFileAtomic(scene.iri(from), scene.iri(to), ReplacementPolicy::Overwrite, {}),
+                      TransactionStatus::Completed);
+            EXPECT_TRUE(scene.holds(content));
+        }
+}
+
 void anInterruptionAtEveryChunkLeavesTheTargetAsItWas(Harness const& harness)
 {
     std::string const content = someContent(severalChunks);
@@ -173,6 +189,8 @@ std::vector<Check> atomicCopyChecks()
                          CHECK_FUNCTION(ontoItselfChangesNothing),
                          CHECK_FUNCTION(anInterruptionAtEveryChunkLeavesTheTargetAsItWas),
                      })
+        .forWritable(both(claims(&Capabilities::atomicCopy), both(makesLinks, makesSecondNames)),
+                     {CHECK_FUNCTION(ontoAnotherNameKeepsTheContent)})
         .when(disclaims(&Capabilities::atomicCopy), {CHECK_FUNCTION(atomicCopiesAreRefused)})
         .checks();
 }

@@ -162,12 +162,12 @@ void settingATimeNeedsAnEntry(Harness const& harness)
 
 void settingATimeIsRefused(Harness const& harness)
 {
-    Scene const scene(harness, {{u"file", "content"}});
-    StorageIRI const file = scene.iri(u"file");
-    ptime const before = scene.provider().getFileAttributes(file).getLastModified();
-    EXPECT_TRUE(scene.refuses([&] { scene.provider().setLastModified(file, sampleTimes().front()); },
-                              ErrorCode::UnsupportedOperation, file));
-    EXPECT_EQ(scene.provider().getFileAttributes(file).getLastModified(), before);
+    Scene const scene(harness, {{u"file", "content"}, {u"folder/", ""}});
+    ptime const before = scene.provider().getFileAttributes(scene.iri(u"file")).getLastModified();
+    for (auto const* const path : {u"file", u"folder"})
+        EXPECT_TRUE(scene.refuses([&] { scene.provider().setLastModified(scene.iri(path), sampleTimes().front()); },
+                                  ErrorCode::UnsupportedOperation, scene.iri(path)));
+    EXPECT_EQ(scene.provider().getFileAttributes(scene.iri(u"file")).getLastModified(), before);
 }
 
 void writabilityIsTakenAndGivenBack(Harness const& harness)
@@ -203,12 +203,12 @@ void settingWritabilityNeedsAnEntry(Harness const& harness)
 
 void settingWritabilityIsRefused(Harness const& harness)
 {
-    Scene const scene(harness, {{u"file", "content"}});
-    StorageIRI const file = scene.iri(u"file");
-    for (bool const writable : {false, true})
-        EXPECT_TRUE(scene.refuses([&] { scene.provider().setWritable(file, writable); },
-                                  ErrorCode::UnsupportedOperation, file));
-    EXPECT_TRUE(scene.provider().getFileAttributes(file).isWritable());
+    Scene const scene(harness, {{u"file", "content"}, {u"folder/", ""}});
+    for (auto const* const path : {u"file", u"folder"})
+        for (bool const writable : {false, true})
+            EXPECT_TRUE(scene.refuses([&] { scene.provider().setWritable(scene.iri(path), writable); },
+                                      ErrorCode::UnsupportedOperation, scene.iri(path)));
+    EXPECT_TRUE(scene.provider().getFileAttributes(scene.iri(u"file")).isWritable());
 }
 
 } // namespace

@@ -110,6 +110,17 @@ void nothingIsToldAfterStopping(Harness const& harness)
     scene.provider().stopPublishingFolderEventsFor(scene.iri(u"going on"));
 }
 
+void stoppingWhatDoesNotRunDoesNothing(Harness const& harness)
+{
+    EventLog log(harness);
+    Scene const scene(harness, {{u"folder/", ""}});
+    scene.provider().stopPublishingFolderEventsFor(scene.iri(u"folder"));
+    scene.provider().publishFolderEventsFor(scene.iri(u"folder"), log.callback(), allKinds);
+    scene.provider().stopPublishingFolderEventsFor(scene.iri(u"folder"));
+    scene.provider().stopPublishingFolderEventsFor(scene.iri(u"folder"));
+    EXPECT_TRUE(scene.holds({{u"folder/", ""}}));
+}
+
 void aCallbackMayStopItsOwnEvents(Harness const& harness)
 {
     EventLog log(harness);
@@ -186,6 +197,7 @@ std::vector<Check> changeEventChecks()
                          CHECK_FUNCTION(aMoveTellsBothLocations),
                          CHECK_FUNCTION(onlyTheKindsAskedForAreTold),
                          CHECK_FUNCTION(nothingIsToldAfterStopping),
+                         CHECK_FUNCTION(stoppingWhatDoesNotRunDoesNothing),
                          CHECK_FUNCTION(aCallbackMayStopItsOwnEvents),
                      })
         .forWritable(claims(&Capabilities::fileEvents), {CHECK_FUNCTION(aFileTellsItsOwnChangesAlone)})

@@ -137,6 +137,29 @@ void aFileReplacesALinkAndNotWhatItLeadsTo(Harness const& harness)
     EXPECT_TRUE(scene.holds({{u"file", "content"}, {u"link", "new"}}));
 }
 
+void aFileReplacesALinkToItself(Harness const& harness)
+{
+    for (ReplacementPolicy const policy : replacingPolicies) {
+        Scene const scene(harness, {{u"file", "content"}});
+        harness.makers.symbolicLink(scene.iri(u"link"), scene.iri(u"file"));
+        scene.provider().moveFile(scene.iri(u"file"), scene.iri(u"link"), policy);
+        EXPECT_EQ(scene.provider().existsExtended(scene.iri(u"link")), ExistenceTypeExtended::RegularFile);
+        EXPECT_TRUE(scene.holds({{u"link", "content"}}));
+    }
+}
+
+/// In place of the file the link would lead to itself, and the content be lost.
+void aLinkDoesNotReplaceWhatItLeadsTo(Harness const& harness)
+{
+    for (ReplacementPolicy const policy : replacingPolicies) {
+        Scene const scene(harness, {{u"file", "content"}});
+        harness.makers.symbolicLink(scene.iri(u"link"), scene.iri(u"file"));
+        scene.provider().moveFile(scene.iri(u"link"), scene.iri(u"file"), policy);
+        EXPECT_EQ(scene.provider().existsExtended(scene.iri(u"file")), ExistenceTypeExtended::RegularFile);
+        EXPECT_TRUE(scene.holds({{u"file", "content"}}));
+    }
+}
+
 } // namespace
 
 std::vector<Check> moveFileChecks()
@@ -155,7 +178,8 @@ std::vector<Check> moveFileChecks()
         .forWritable(makesSecondNames, {CHECK_FUNCTION(ontoItsSecondNameKeepsTheContent),
                                         CHECK_FUNCTION(aPreservingPolicyKeepsASecondName)})
         .forWritable(makesLinks,
-                     {CHECK_FUNCTION(linksAreMovedThemselves), CHECK_FUNCTION(aFileReplacesALinkAndNotWhatItLeadsTo)})
+                     {CHECK_FUNCTION(linksAreMovedThemselves), CHECK_FUNCTION(aFileReplacesALinkAndNotWhatItLeadsTo),
+                      CHECK_FUNCTION(aFileReplacesALinkToItself), CHECK_FUNCTION(aLinkDoesNotReplaceWhatItLeadsTo)})
         .checks();
 }
 

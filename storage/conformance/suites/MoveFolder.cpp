@@ -115,6 +115,21 @@ void aLinkToAFolderIsNotThatFolder(Harness const& harness)
         ErrorCode::InvalidLocation, scene.iri(u"link/new")));
 }
 
+void ontoALinkToItselfChangesNothing(Harness const& harness)
+{
+    Scene const scene(harness, {{u"folder/", ""}, {u"folder/inner", "inner"}});
+    harness.makers.symbolicLink(scene.iri(u"link"), scene.iri(u"folder"));
+    Tree const before = scene.tree();
+    for (ReplacementPolicy const policy : replacingPolicies) {
+        scene.provider().moveFolder(scene.iri(u"folder"), scene.iri(u"link"), policy);
+        EXPECT_TRUE(scene.holds(before));
+    }
+    for (ReplacementPolicy const policy : preservingPolicies)
+        EXPECT_TRUE(
+            scene.refuses([&] { scene.provider().moveFolder(scene.iri(u"folder"), scene.iri(u"link"), policy); },
+                          ErrorCode::ResourceAlreadyExists, scene.iri(u"link")));
+}
+
 } // namespace
 
 std::vector<Check> moveFolderChecks()
@@ -129,7 +144,8 @@ std::vector<Check> moveFolderChecks()
             CHECK_FUNCTION(aFolderDoesNotMoveBelowItselfByADetour),
             CHECK_FUNCTION(ontoItselfChangesNothing),
         })
-        .forWritable(makesLinks, {CHECK_FUNCTION(aLinkToAFolderIsNotThatFolder)})
+        .forWritable(makesLinks,
+                     {CHECK_FUNCTION(aLinkToAFolderIsNotThatFolder), CHECK_FUNCTION(ontoALinkToItselfChangesNothing)})
         .checks();
 }
 

@@ -54,12 +54,22 @@ void removeFolderNeedsAFolder(Harness const& harness)
 
 void removeFileRemovesALinkAndNotItsTarget(Harness const& harness)
 {
-    Scene const scene(harness, {{u"file", "content"}});
+    Tree const content{{u"file", "content"}, {u"folder/", ""}, {u"folder/inner", "inner"}};
+    Scene const scene(harness, content);
     harness.makers.symbolicLink(scene.iri(u"link"), scene.iri(u"file"));
+    harness.makers.symbolicLink(scene.iri(u"to folder"), scene.iri(u"folder"));
     harness.makers.symbolicLink(scene.iri(u"dangling"), scene.iri(u"missing"));
-    scene.provider().removeFile(scene.iri(u"link"));
-    scene.provider().removeFile(scene.iri(u"dangling"));
-    EXPECT_TRUE(scene.holds({{u"file", "content"}}));
+    for (auto const* const link : {u"link", u"to folder", u"dangling"})
+        scene.provider().removeFile(scene.iri(link));
+    EXPECT_TRUE(scene.holds(content));
+}
+
+void aLinkToAFolderIsNotRemovedAsAFolder(Harness const& harness)
+{
+    Scene const scene(harness, {{u"folder/", ""}});
+    harness.makers.symbolicLink(scene.iri(u"link"), scene.iri(u"folder"));
+    EXPECT_TRUE(scene.refuses([&] { scene.provider().removeFolder(scene.iri(u"link")); }, ErrorCode::InvalidLocation,
+                              scene.iri(u"link")));
 }
 
 void removeFolderRecursivelyRemovesAllBelow(Harness const& harness)
@@ -117,7 +127,8 @@ std::vector<Check> removalChecks()
             CHECK_FUNCTION(removeFolderRefusesAFullOne),
             CHECK_FUNCTION(removeFolderNeedsAFolder),
         })
-        .forWritable(makesLinks, {CHECK_FUNCTION(removeFileRemovesALinkAndNotItsTarget)})
+        .forWritable(makesLinks, {CHECK_FUNCTION(removeFileRemovesALinkAndNotItsTarget),
+                                  CHECK_FUNCTION(aLinkToAFolderIsNotRemovedAsAFolder)})
         .forWritable(claims(&Capabilities::recursiveRemoval), {CHECK_FUNCTION(removeFolderRecursivelyRemovesAllBelow),
                                                                CHECK_FUNCTION(removeFolderRecursivelyNeedsAFolder)})
         .forWritable(both(claims(&Capabilities::recursiveRemoval), makesLinks),

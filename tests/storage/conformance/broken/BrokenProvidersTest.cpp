@@ -93,6 +93,22 @@ TEST(BrokenProviders, EveryCheckHasOneThatItRejects)
         EXPECT_TRUE(covered.contains(check.family + '.' + check.name)) << check.family << '.' << check.name;
 }
 
+/// The providers that the broken ones are made of and that no program of its own tries.
+class SoundProviders : public testing::TestWithParam<Harness (*)()>
+{};
+
+TEST_P(SoundProviders, PassTheWholeKit)
+{
+    Harness const harness = GetParam()();
+    for (Check const& check : applicable(allChecks(), harness))
+        EXPECT_EQ(violations(check, harness), std::vector<std::string>{}) << check.family << '.' << check.name;
+}
+
+INSTANTIATE_TEST_SUITE_P(Plain, SoundProviders, testing::Values(plainHarness));
+INSTANTIATE_TEST_SUITE_P(ReadOnly, SoundProviders, testing::Values(readOnlyHarness));
+INSTANTIATE_TEST_SUITE_P(Recursive, SoundProviders, testing::Values(recursiveHarness));
+INSTANTIATE_TEST_SUITE_P(Picky, SoundProviders, testing::Values(pickyHarness));
+
 } // namespace
 
 Harness brokenHarness(Defect const& defect)

@@ -172,6 +172,12 @@ Table atomicCopy()
               [](Store s, Iri from, Iri to, Policy p, Interrupt) { return s.copyFileAtomic(from, to, p, {}); })},
          {"AnInterruptionAtEveryChunkLeavesTheTargetAsItWas", "WritesInPlace", copyingAtomically(inPlace)},
          {"AnInterruptionAtEveryChunkLeavesTheTargetAsItWas", "LeavesAScratchFile", copyingAtomically(littering)},
+         {"OntoAnotherNameKeepsTheContent", "TruncatesTheTargetFirst",
+          copyingAtomically([](Store s, Iri from, Iri to, Policy, Interrupt) {
+              copyInPlace(s, from, to, oneMebibyte);
+              return TransactionStatus::Completed;
+          }),
+          atomicHarness},
          {"AtomicCopiesAreRefused", "CopiesAllTheSame",
           copyingAtomically([](Store s, Iri from, Iri to, Policy p, Interrupt) {
               s.copyFile(from, to, p);

@@ -174,6 +174,14 @@ Table removal()
               "RemovesWhatALinkLeadsTo",
               {.removeFile = [](Store s, Iri i) { s.removeFile(i.getName() == u"link" ? sibling(i, u"file") : i); }},
               localHarness},
+             {"ALinkToAFolderIsNotRemovedAsAFolder",
+              "RemovesTheLink",
+              {.removeFolder =
+                   [](Store s, Iri i) {
+                       s.existsExtended(i) == ExistenceTypeExtended::SymlinkToFolder ? s.removeFile(i)
+                                                                                     : s.removeFolder(i);
+                   }},
+              localHarness},
              {"RemoveFolderRecursivelyRemovesAllBelow",
               "RemovesFilesOfTheFirstLevel",
               {.removeFolderRecursively =

@@ -83,6 +83,17 @@ Table moveFile()
               s.copyFile(from, to, p);
               s.removeFile(from);
           }),
+          localHarness},
+         {"AFileReplacesALinkToItself", "TakesThemForOne", movingFiles([](Store s, Iri from, Iri to, Policy p) {
+              if (!s.fileExists(to))
+                  s.moveFile(from, to, p);
+          }),
+          localHarness},
+         {"ALinkDoesNotReplaceWhatItLeadsTo", "RemovesTheTargetFirst",
+          movingFiles([](Store s, Iri from, Iri to, Policy p) {
+              s.removeFile(to);
+              s.moveFile(from, to, p);
+          }),
           localHarness}}};
 }
 
@@ -134,6 +145,12 @@ Table moveFolder()
          {"ALinkToAFolderIsNotThatFolder", "SaysResourceNotFound",
           movingFolders([](Store s, Iri from, Iri to, Policy p) {
               miscoded([&] { s.moveFolder(from, to, p); }, ErrorCode::ResourceNotFound);
+          }),
+          localHarness},
+         {"OntoALinkToItselfChangesNothing", "ReplacesTheLink", movingFolders([](Store s, Iri from, Iri to, Policy p) {
+              if (!preserves(p))
+                  swallowed([&] { s.removeFile(to); });
+              s.moveFolder(from, to, p);
           }),
           localHarness}}};
 }

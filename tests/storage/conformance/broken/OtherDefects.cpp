@@ -48,7 +48,6 @@ void ofTheWholeFolder(Store s, Iri i, ChangeEventCallback const& callback, Kinds
     s.publishFolderEventsFor(i.getParent(), callback, kinds);
 }
 
-/// Fails to stop events from inside their callback, which is where all these are stopped.
 void refusingToStop(Store, Iri i)
 {
     throw Exception(ErrorCode::ResourceInUse, i);
@@ -67,6 +66,7 @@ Table changeEvents()
              {"AMoveTellsBothLocations", "TellsOne", {.publishFolderEventsFor = withoutSecondLocation}},
              {"OnlyTheKindsAskedForAreTold", "TellsAllKinds", {.publishFolderEventsFor = ofAllKinds}},
              {"NothingIsToldAfterStopping", "DoesNotStop", {.stopPublishingEventsFor = [](Store, Iri) {}}},
+             {"StoppingWhatDoesNotRunDoesNothing", "Fails", {.stopPublishingEventsFor = refusingToStop}},
              {.check = "ACallbackMayStopItsOwnEvents",
               .name = "RefusesToStop",
               .misbehaviour = {.stopPublishingEventsFor = refusingToStop},

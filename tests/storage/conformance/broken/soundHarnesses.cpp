@@ -2,6 +2,8 @@
 
 #include <storage/conformance/detail/content.hpp>
 #include <storage/provider/IReadOnlyProvider.hpp>
+#include <storage/provider/StorageItem.hpp>
+#include <storage/provider/TransactionPolicy.hpp>
 #include <tests/storage/conformance/broken/Misbehaviour.hpp>
 #include <tests/support/VectorListing.hpp>
 
@@ -140,6 +142,28 @@ private:
     }
 };
 
+class AtomicProvider final : public ForwardingProvider
+{
+public:
+    explicit AtomicProvider(std::shared_ptr<IProvider> store) : ForwardingProvider(store), store_(std::move(store)) {}
+
+protected:
+    TransactionStatus doCopyFileAtomic(Iri from, Iri to, Policy const& policy,
+                                       Interrupt const& interrupt) const override
+    {
+        return StorageItem(store_, from)
+            .copyFile(StorageItem(store_, to), {policy, TransactionPolicy::Atomic, interrupt});
+    }
+
+    bool doHasFeature(ExtendedFeature const& feature) const override
+    {
+        return feature == ExtendedFeature::AtomicFileCopy || target().hasFeature(feature);
+    }
+
+private:
+    std::shared_ptr<IProvider> store_;
+};
+
 /// The harness with every provider wrapped.
 template <typename Wrap>
 Harness wrapped(Harness harness, Wrap const& wrap)
@@ -185,6 +209,14 @@ Harness recursiveHarness()
         wrapped(localHarness(), [](auto const& store) { return std::make_shared<RecursiveProvider>(store); });
     harness.capabilities.recursiveListing = true;
     harness.capabilities.recursiveRemoval = true;
+    return harness;
+}
+
+Harness atomicHarness()
+{
+    Harness harness =
+        wrapped(localHarness(), [](auto const& store) { return std::make_shared<AtomicProvider>(store); });
+    harness.capabilities.atomicCopy = true;
     return harness;
 }
 

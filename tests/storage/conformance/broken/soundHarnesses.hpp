@@ -15,6 +15,9 @@ Harness readOnlyHarness();
 /// Local files, links among them, with recursive listing and removal.
 Harness recursiveHarness();
 
+/// Local files, links among them, with atomic copies.
+Harness atomicHarness();
+
 /// Stores that do not tell names apart by letter case, or by normalisation.
 Harness caselessHarness();
 Harness unnormalisedHarness();
