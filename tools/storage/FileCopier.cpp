@@ -1,11 +1,14 @@
 #include <tools/storage/FileCopier.hpp>
 
+#include <tools/storage/AtomicFile.hpp>
+#include <tools/storage/PlainFile.hpp>
 #include <tools/storage/describe.hpp>
 #include <tools/storage/interrupt.hpp>
-#include <tools/storage/kinds.hpp>
 #include <tools/storage/readSome.hpp>
 
 #include <cstring>
+#include <memory>
+#include <optional>
 
 namespace foundation::storage::tool {
 
@@ -20,11 +23,50 @@ bool isAllZero(std::string_view chunk)
            std::memcmp(chunk.data(), chunk.data() + 1, chunk.size() - 1) == 0;
 }
 
+void checkStop(WorkerContext const& context)
+{
+    checkInterrupt();
+    if (context.stop.stop_requested())
+        throw Interrupted{0};
+}
+
+std::unique_ptr<TargetFile> openTarget(Place const& target, CopyOptions const& options)
+{
+    return at(target, [&]() -> std::unique_ptr<TargetFile> {
+        if (options.isInPlace)
+            return std::make_unique<PlainFile>(target.item(), options.replace);
+        return std::make_unique<AtomicFile>(target.item(), options.replace);
+    });
+}
+
+/// To be called from a handler: throws what is being handled, together with what is left of the target.
+[[noreturn]] void rethrowWithLeftover(Place const& target, TargetFile const& output)
+{
+    try {
+        throw;
+    } catch (Failure const& failure) {
+        std::string const where = failure.location == target.text() ? "" : target.text() + ": ";
+        throw Failure{failure.location, failure.reason + "; " + where + output.leftover()};
+    } catch (...) {
+        throw Failure{target.text(), output.leftover()};
+    }
+}
+
+/// A copy is younger than what it was made of.
+std::optional<std::uint64_t> sizeIfUpToDate(Place const& source, Place const& target)
+{
+    auto const original = at(source, [&] { return source.item().getFileAttributes(); });
+    auto const copied = at(target, [&] { return target.item().getFileAttributes(); });
+    bool const isUpToDate =
+        original.getSize() == copied.getSize() && copied.getLastModified() >= original.getLastModified();
+    return isUpToDate ? std::optional(original.getSize()) : std::nullopt;
+}
+
 } // namespace
 
-void requireFileTarget(Place const& target, Replace replace)
+void requireFileTarget(Place const& target, Kind kind, Replace replace)
 {
-    switch (kindOf(target)) {
+    switch (kind) {
     case Kind::None:
         return;
     case Kind::RegularFolder:
@@ -40,50 +82,58 @@ void requireFileTarget(Place const& target, Replace replace)
     }
 }
 
-FileCopier::FileCopier(Session& session, CopyOptions const& options)
-    : session_(session), options_(options), buffer_(makeTransferBuffer())
-{}
-
-void FileCopier::copy(Place const& source, Place const& target)
+void requireFileTarget(Place const& target, Replace replace)
 {
-    requireFileTarget(target, options_.replace);
-    copyToFreeTarget(source, target);
+    requireFileTarget(target, kindOf(target), replace);
 }
 
-void FileCopier::copyToFreeTarget(Place const& source, Place const& target)
+FileCopier::FileCopier(Progress& progress, CopyOptions const& options) : progress_(progress), options_(options) {}
+
+CopiedFile FileCopier::copy(Place const& source, Place const& target, TargetState state, WorkerContext& context) const
 {
-    checkInterrupt();
-    transfer(source, target);
-    session_.progress().addFile();
-    if (options_.isVerbose)
-        session_.printName(source.text() + " -> " + target.text());
+    checkStop(context);
+    Kind const kind = state == TargetState::Free ? Kind::None : kindOf(target);
+    if (options_.isUpdate && kind == Kind::RegularFile) {
+        if (auto const size = sizeIfUpToDate(source, target)) {
+            progress_.skipFile(*size);
+            return {*size, true};
+        }
+    }
+    requireFileTarget(target, kind, options_.replace);
+    if (options_.isInPlace && isLink(kind))
+        throw Failure{target.text(), "a link, through which nothing is written"};
+    std::uint64_t const size = transfer(source, target, context);
+    progress_.addFile();
+    return {size, false};
 }
 
-void FileCopier::transfer(Place const& source, Place const& target)
+std::uint64_t FileCopier::transfer(Place const& source, Place const& target, WorkerContext& context) const
 {
     auto const input = at(source, [&] { return source.item().openReadOnlyStream(); });
-    auto const output = at(target, [&] { return std::make_unique<AtomicFile>(target.item(), options_.replace); });
+    auto const output = openTarget(target, options_);
     try {
-        long const size = copyBytes(source, *input, target, *output);
-        at(target, [&] { output->commit(size); });
+        std::uint64_t const size = copyBytes(source, *input, target, *output, context);
+        at(target, [&] { output->commit(static_cast<long>(size)); });
+        return size;
     } catch (...) {
         if (!output->discard())
-            session_.complain({target.text(), "what was written beside it could not be removed"});
+            rethrowWithLeftover(target, *output);
         throw;
     }
 }
 
-long FileCopier::copyBytes(Place const& source, provider::ByteStream& input, Place const& target, AtomicFile& output)
+std::uint64_t FileCopier::copyBytes(Place const& source, provider::ByteStream& input, Place const& target,
+                                    TargetFile& output, WorkerContext& context) const
 {
-    long size = 0;
-    for (std::string_view chunk = readSome(source, input, buffer_); !chunk.empty();
-         chunk = readSome(source, input, buffer_))
+    std::uint64_t size = 0;
+    for (std::string_view chunk = readSome(source, input, context.buffer); !chunk.empty();
+         chunk = readSome(source, input, context.buffer))
     {
         auto const count = static_cast<long>(chunk.size());
         at(target, [&] { isAllZero(chunk) ? output.writeZeros(count) : output.write(chunk.data(), count); });
-        size += count;
-        session_.progress().addBytes(count);
-        checkInterrupt();
+        size += chunk.size();
+        progress_.addBytes(count);
+        checkStop(context);
     }
     return size;
 }

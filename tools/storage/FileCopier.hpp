@@ -1,46 +1,65 @@
 #pragma once
 
 #include <storage/provider/ByteStream.hpp>
-#include <tools/storage/AtomicFile.hpp>
+#include <tools/storage/OrderedWorkers.hpp>
 #include <tools/storage/Place.hpp>
-#include <tools/storage/Session.hpp>
+#include <tools/storage/Progress.hpp>
+#include <tools/storage/TargetFile.hpp>
+#include <tools/storage/kinds.hpp>
 
-#include <vector>
+#include <cstdint>
 
 namespace foundation::storage::tool {
 
 struct CopyOptions
 {
     Replace replace = Replace::Never;
-    bool isVerbose = false;
+    bool isInPlace = false; ///< each file is written at its target; otherwise it appears there whole or not at all
+    bool isUpdate = false;  ///< what is up to date already is passed over
 };
 
-/// Copies files one by one, each all-or-nothing.
+/// What became of a file.
+struct CopiedFile
+{
+    std::uint64_t size;
+    bool wasUpToDate;
+};
+
+/// What is known of a target before it is looked at.
+enum class TargetState
+{
+    Unknown,
+    Free, ///< nothing stood there a moment ago; should something appear, it is replaced only if that was asked for
+};
+
+/// Copies files one by one.
+///
+/// Threads: any number at once.
 class FileCopier
 {
 public:
-    FileCopier(Session& session, CopyOptions const& options);
+    FileCopier(Progress& progress, CopyOptions const& options);
 
     CopyOptions const& options() const { return options_; }
 
-    /// Throws `Failure` at the source or at the target, whichever it was, and `Interrupted`; the target is then as it
-    /// was. A source that is a link is copied as the file that it leads to.
-    void copy(Place const& source, Place const& target);
-
-    /// The same without a look at the target first, for when it is known that nothing stands there. Should something
-    /// appear after all, it is not replaced unless that was asked for.
-    void copyToFreeTarget(Place const& source, Place const& target);
+    /// Throws `Failure` at the source or at the target, whichever it was, and `Interrupted`, also when the context is
+    /// asked to stop; the target is then as it was, unless the copy was in place. A source that is a link is copied as
+    /// the file that it leads to.
+    CopiedFile copy(Place const& source, Place const& target, TargetState state, WorkerContext& context) const;
 
 private:
-    void transfer(Place const& source, Place const& target);
-    long copyBytes(Place const& source, provider::ByteStream& input, Place const& target, AtomicFile& output);
+    std::uint64_t transfer(Place const& source, Place const& target, WorkerContext& context) const;
+    std::uint64_t copyBytes(Place const& source, provider::ByteStream& input, Place const& target, TargetFile& output,
+                            WorkerContext& context) const;
 
-    Session& session_;
+    Progress& progress_;
     CopyOptions options_;
-    std::vector<char> buffer_;
 };
 
-/// Throws `Failure` unless a file may be put at `target`: nothing stands there, or a file that may be replaced.
+/// Throws `Failure` unless a file may be put at `target`, where `kind` stands: nothing, or a file that may be replaced.
+void requireFileTarget(Place const& target, Kind kind, Replace replace);
+
+/// The same, after a look.
 void requireFileTarget(Place const& target, Replace replace);
 
 } // namespace foundation::storage::tool

@@ -17,6 +17,14 @@ void Session::printName(std::string_view bytes, char terminator)
     output_.endLine(terminator);
 }
 
+/// It is in ASCII, and holds nothing that a terminal would obey.
+void Session::printJSON(std::string_view object)
+{
+    progress_.erase();
+    output_.write(object);
+    output_.endLine();
+}
+
 void Session::complain(Failure const& failure)
 {
     status_ = exitFailed;

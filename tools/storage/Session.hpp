@@ -31,6 +31,9 @@ public:
     /// Writes a line of results, which `printable` has not gone over.
     void printName(std::string_view bytes, char terminator = '\n');
 
+    /// Writes a JSON object as a line of results.
+    void printJSON(std::string_view object);
+
     /// Writes "storage: COMMAND: LOCATION: REASON" to standard error; the command has failed.
     void complain(Failure const& failure);
 

@@ -32,72 +32,51 @@ bool makeFolder(Place const& target)
 
 } // namespace
 
-Kind requireCopyable(Place const& source)
-{
-    Kind const kind = existingKindOf(source);
-    switch (kind) {
-    case Kind::SymlinkToFolder:
-        throw Failure{source.text(), "a link to a folder, not followed"};
-    case Kind::BrokenSymlink:
-        throw Failure{source.text(), "a broken link, not copied"};
-    case Kind::SpecialFile:
-        throw Failure{source.text(), "a special file, not copied"};
-    case Kind::RegularFile:
-    case Kind::SymlinkToFile:
-    case Kind::RegularFolder:
-    case Kind::None:
-        break;
-    }
-    return kind;
-}
+TreeCopier::TreeCopier(CopyRun& run) : run_(run) {}
 
-TreeCopier::TreeCopier(Session& session, FileCopier& files, FileLinks links)
-    : session_(session), files_(files), links_(links)
-{}
-
-bool TreeCopier::copy(Place const& source, Place const& target)
+void TreeCopier::copy(Place const& source, Place const& target)
 {
-    isComplete_ = session_.attempt([&] { enter(source, target); });
-    while (!levels_.empty()) {
+    for (enter(source, target); !levels_.empty(); step())
         checkInterrupt();
-        isComplete_ &= session_.attempt([&] { step(); });
-    }
-    return isComplete_;
 }
 
+/// A listing that fails is through.
 void TreeCopier::step()
 {
     FolderLevel& level = levels_.innermost();
-    if (!level.hasNext()) {
-        levels_.leave();
+    try {
+        if (level.hasNext())
+            return copyEntry(level, level.next());
+    } catch (Failure const& failure) {
+        run_.fail(level.folder(), level.counterpart(), failure);
         return;
     }
-    ListedName const entry = level.next();
-    copyEntry(level.folder().child(entry.name), level.counterpart().child(entry.name));
+    levels_.leave();
 }
 
-void TreeCopier::copyEntry(Place const& source, Place const& target)
+/// What a listing calls a folder may be a link to one.
+void TreeCopier::copyEntry(FolderLevel const& level, ListedName const& entry)
 {
-    Kind const kind = requireCopyable(source);
-    if (kind == Kind::SymlinkToFile && links_ == FileLinks::Refuse)
-        throw Failure{source.text(), "a link, which would become a file"};
-    if (kind == Kind::RegularFolder)
-        enter(source, target);
-    else if (levels_.innermost().isFresh)
-        files_.copyToFreeTarget(source, target);
+    Place source = level.folder().child(entry.name);
+    Place target = level.counterpart().child(entry.name);
+    if (entry.isFile)
+        run_.copyFile(std::move(source), std::move(target), level.isFresh ? TargetState::Free : TargetState::Unknown);
     else
-        files_.copy(source, target);
+        enter(source, target);
 }
 
 /// Opens the source before the target is made, so that nothing is left of a folder that cannot be read.
 void TreeCopier::enter(Place const& source, Place const& target)
 {
-    levels_.enter(source, target);
+    std::size_t const depth = levels_.depth();
     try {
+        requireCopyable(source);
+        levels_.enter(source, target);
         levels_.innermost().isFresh = makeFolder(target);
-    } catch (Failure const&) {
-        levels_.leave();
-        throw;
+    } catch (Failure const& failure) {
+        if (levels_.depth() > depth)
+            levels_.leave();
+        run_.fail(source, target, failure);
     }
 }
 

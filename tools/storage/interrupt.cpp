@@ -1,5 +1,6 @@
 #include <tools/storage/interrupt.hpp>
 
+#include <atomic>
 #include <cerrno>
 #include <csignal>
 #include <poll.h>
@@ -11,40 +12,18 @@ namespace {
 constexpr int patience = 3;
 constexpr int caughtSignals[]{SIGINT, SIGTERM, SIGHUP};
 
-std::sig_atomic_t volatile pendingSignal = 0;
-std::sig_atomic_t volatile signalCount = 0;
+std::atomic<int> pendingSignal = 0;
+std::atomic<int> signalCount = 0;
+static_assert(std::atomic<int>::is_always_lock_free, "or handlers could not use it");
 
 extern "C" void rememberSignal(int signal)
 {
     pendingSignal = signal;
-    signalCount = signalCount + 1;
-    if (signalCount >= patience) {
+    if (++signalCount >= patience) {
         std::signal(signal, SIG_DFL);
         std::raise(signal);
     }
 }
-
-/// Holds interrupts back while it lives.
-class HeldInterrupts
-{
-public:
-    HeldInterrupts()
-    {
-        sigset_t held;
-        sigemptyset(&held);
-        for (int const signal : caughtSignals)
-            sigaddset(&held, signal);
-        pthread_sigmask(SIG_BLOCK, &held, &before_);
-    }
-    ~HeldInterrupts() { pthread_sigmask(SIG_SETMASK, &before_, nullptr); }
-    HeldInterrupts(HeldInterrupts const&) = delete;
-    HeldInterrupts& operator=(HeldInterrupts const&) = delete;
-
-    sigset_t const& maskBefore() const { return before_; }
-
-private:
-    sigset_t before_;
-};
 
 void catchInterrupt(int signal)
 {
@@ -74,6 +53,20 @@ void waitFor(int descriptor, short event)
 }
 
 } // namespace
+
+HeldInterrupts::HeldInterrupts()
+{
+    sigset_t held;
+    sigemptyset(&held);
+    for (int const signal : caughtSignals)
+        sigaddset(&held, signal);
+    pthread_sigmask(SIG_BLOCK, &held, &before_);
+}
+
+HeldInterrupts::~HeldInterrupts()
+{
+    pthread_sigmask(SIG_SETMASK, &before_, nullptr);
+}
 
 void catchInterrupts()
 {

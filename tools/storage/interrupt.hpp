@@ -1,11 +1,15 @@
 #pragma once
 
+#include <csignal>
+#include <string>
+
 namespace foundation::storage::tool {
 
 /// The user asked to stop. Not a `std::exception`, so that it passes whatever handles failures.
 struct Interrupted
 {
     int signal;
+    std::string done = {}; ///< what was done until then, in words for the user; empty when there is nothing to say
 };
 
 /// Makes SIGINT, SIGTERM and SIGHUP requests to stop, which work looks for between two steps. The third one ends the
@@ -14,6 +18,22 @@ void catchInterrupts();
 
 /// Throws `Interrupted` when the user asked to stop.
 void checkInterrupt();
+
+/// Holds interrupts back from this thread, and for ever from the threads that it starts meanwhile, while it lives. They
+/// go to the main thread, whose waits they end.
+class HeldInterrupts
+{
+public:
+    HeldInterrupts();
+    ~HeldInterrupts();
+    HeldInterrupts(HeldInterrupts const&) = delete;
+    HeldInterrupts& operator=(HeldInterrupts const&) = delete;
+
+    sigset_t const& maskBefore() const { return before_; }
+
+private:
+    sigset_t before_;
+};
 
 /// Waits until a descriptor can be read. Throws `Interrupted` at once when the signal comes, be it just before the
 /// wait.

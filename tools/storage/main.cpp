@@ -56,7 +56,7 @@ int finish(std::string const& command, Work const& work)
     } catch (Failure const& failure) {
         writeError(command, printable(failure.location) + ": " + printable(failure.reason));
     } catch (Interrupted const& interrupted) {
-        writeError(command, "interrupted");
+        writeError(command, interrupted.done.empty() ? "interrupted" : "interrupted: " + interrupted.done);
         return 128 + interrupted.signal;
     } catch (OutputFailure const& failure) {
         return reportOutputFailure(failure, command);

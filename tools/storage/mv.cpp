@@ -1,13 +1,19 @@
+#include <tools/storage/CopyRun.hpp>
 #include <tools/storage/Session.hpp>
 #include <tools/storage/TargetOperand.hpp>
 #include <tools/storage/TreeCopier.hpp>
 #include <tools/storage/TreeRemover.hpp>
 #include <tools/storage/arguments.hpp>
 #include <tools/storage/commands.hpp>
+#include <tools/storage/copyOptions.hpp>
 #include <tools/storage/describe.hpp>
+#include <tools/storage/interrupt.hpp>
+#include <tools/storage/transfers.hpp>
 
 #include <boost/date_time/posix_time/posix_time_types.hpp>
+#include <fmt/format.h>
 #include <memory>
+#include <optional>
 #include <storage/provider/Exception.hpp>
 
 namespace foundation::storage::tool {
@@ -21,7 +27,7 @@ struct Options
 {
     std::vector<std::string> paths;
     bool replaces = false;
-    bool isVerbose = false;
+    TransferOptions transfers;
 };
 
 class Move
@@ -29,19 +35,24 @@ class Move
 public:
     Move(Session& session, Options const& options, Place target);
 
-    void move(Place const& source);
+    void moveAll(std::vector<std::string> const& sources);
 
 private:
+    void moveArgument(std::string const& argument);
+    void move(Place const& source);
     bool moveWithinStore(Place const& source, Kind kind, Place const& target) const;
-    void moveByCopying(Place const& source, Kind kind, Place const& target);
+    bool moveByCopying(Place const& source, Kind kind, Place const& target);
+    bool moveFileByCopying(Place const& source, Place const& target);
     void moveFolderByCopying(Place const& source, Place const& target);
+    void tell(Place const& source, Place const& target);
 
     Session& session_;
     Replace replace_;
-    FileCopier files_;
+    CopyRun run_;
     TreeCopier trees_;
     TargetOperand target_;
-    bool isVerbose_;
+    Telling telling_;
+    std::size_t moved_ = 0;
 };
 
 void requireMovable(Place const& source)
@@ -70,14 +81,51 @@ void requireCopied(Place const& source, Place const& copy, ptime const& start)
         throw Failure{source.text(), "changed while it was moved, and stays"};
 }
 
+CopyRunOptions runOptions(Options const& options, Replace replace)
+{
+    CopyRunOptions result;
+    result.files.replace = replace;
+    result.links = FileLinks::Refuse;
+    result.telling = options.transfers.isJSON ? Telling::JSON : Telling::Nothing;
+    result.jobs = jobsOf(options.transfers);
+    return result;
+}
+
 Move::Move(Session& session, Options const& options, Place target)
     : session_(session),
       replace_(options.replaces ? Replace::Files : Replace::Never),
-      files_(session, {replace_, false}),
-      trees_(session, files_, FileLinks::Refuse),
+      run_(session, runOptions(options, replace_)),
+      trees_(run_),
       target_(std::move(target), options.paths.size() - 1),
-      isVerbose_(options.isVerbose)
+      telling_(tellingOf(options.transfers))
 {}
+
+/// Of several sources, some may be moved in one step, and it is not known which.
+void Move::moveAll(std::vector<std::string> const& sources)
+{
+    if (sources.size() == 1 && session_.progress().isShown())
+        run_.announce(placesOf(session_, sources));
+    try {
+        for (std::string const& source : sources)
+            moveArgument(source);
+    } catch (Interrupted const& interrupted) {
+        std::string const copied = run_.stop(false);
+        throw Interrupted{interrupted.signal, fmt::format("{} of {} moved; {}", moved_, sources.size(), copied)};
+    }
+}
+
+void Move::moveArgument(std::string const& argument)
+{
+    std::optional<Place> source;
+    try {
+        source = session_.stores().open(argument);
+        move(*source);
+    } catch (Failure const& failure) {
+        if (telling_ == Telling::JSON)
+            session_.printJSON(toJSON(source ? failedTransfer(*source, failure) : failedTransfer(failure)));
+        session_.complain(failure);
+    }
+}
 
 void Move::move(Place const& source)
 {
@@ -88,9 +136,17 @@ void Move::move(Place const& source)
         requireFolderTarget(target);
     else
         requireFileTarget(target, replace_);
-    if (!moveWithinStore(source, kind, target))
-        moveByCopying(source, kind, target);
-    if (isVerbose_)
+    if (!moveWithinStore(source, kind, target) && !moveByCopying(source, kind, target))
+        return;
+    ++moved_;
+    tell(source, target);
+}
+
+void Move::tell(Place const& source, Place const& target)
+{
+    if (telling_ == Telling::JSON)
+        session_.printJSON(toJSON(transferOf(source, target, "moved")));
+    else if (telling_ == Telling::Names)
         session_.printName(source.text() + " -> " + target.text());
 }
 
@@ -115,25 +171,39 @@ bool Move::moveWithinStore(Place const& source, Kind kind, Place const& target) 
     return true;
 }
 
-void Move::moveByCopying(Place const& source, Kind kind, Place const& target)
+/// Answers whether it was moved; if not, that has been complained about.
+bool Move::moveByCopying(Place const& source, Kind kind, Place const& target)
 {
-    if (kind == Kind::RegularFolder)
-        return moveFolderByCopying(source, target);
-    if (kind != Kind::RegularFile)
+    if (kind == Kind::RegularFile)
+        return moveFileByCopying(source, target);
+    if (kind != Kind::RegularFolder)
         throw Failure{source.text(), "a link or a special file, which cannot be moved to another store"};
+    moveFolderByCopying(source, target);
+    return true;
+}
+
+bool Move::moveFileByCopying(Place const& source, Place const& target)
+{
     ptime const start = microsec_clock::universal_time();
-    files_.copy(source, target);
+    run_.copyFile(source, target, TargetState::Unknown);
+    if (!run_.finish())
+        return false;
     requireCopied(source, target, start);
     at(source, [&] { source.item().removeFile(); });
+    return true;
 }
 
 void Move::moveFolderByCopying(Place const& source, Place const& target)
 {
     ptime const start = microsec_clock::universal_time();
-    if (!trees_.copy(source, target))
+    trees_.copy(source, target);
+    if (!run_.finish())
         throw Failure{source.text(), "stays, because not all of it could be copied; what could is in " + target.text()};
     TreeRemover(session_).remove(source, target,
                                  [&](Place const& file, Place const& copy) { requireCopied(file, copy, start); });
+    if (kindOf(source) != Kind::None)
+        throw Failure{source.text(),
+                      "stays in part, because not all of it could be removed; it was copied to " + target.text()};
 }
 
 void moveAll(Session& session, Options const& options)
@@ -141,8 +211,9 @@ void moveAll(Session& session, Options const& options)
     std::vector<std::string> sources = options.paths;
     Place target = session.stores().open(sources.back());
     sources.pop_back();
-    Move move(session, options, std::move(target));
-    session.forEachPlace(sources, [&](Place const& source) { move.move(source); });
+    if (options.transfers.showsProgress)
+        session.progress().showLines();
+    Move(session, options, std::move(target)).moveAll(sources);
 }
 
 } // namespace
@@ -151,7 +222,7 @@ Action defineMv(CLI::App& app)
 {
     auto const options = std::make_shared<Options>();
     addFlag(app, "--replace", options->replaces, "Replace files at the target; folders are never replaced");
-    addFlag(app, "-v,--verbose", options->isVerbose, "Name what was moved");
+    addTransferOptions(app, "Name what was moved", options->transfers);
     addOperands(app, "SOURCE... TARGET", "What to move, and the folder that receives it, or its new name", 2,
                 options->paths);
     return [options](Session& session) { moveAll(session, *options); };

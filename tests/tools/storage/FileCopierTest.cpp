@@ -4,6 +4,7 @@
 #include <storage/provider/Exception.hpp>
 #include <tests/support/MinimalProvider.hpp>
 #include <tests/support/RecordingByteStream.hpp>
+#include <tools/storage/Failure.hpp>
 
 namespace {
 
@@ -36,7 +37,7 @@ protected:
     std::string failure()
     {
         try {
-            FileCopier(session, {}).copy(source, target);
+            copier.copy(source, target, TargetState::Unknown, context);
             return "";
         } catch (Failure const& failure) {
             EXPECT_EQ(failure.location, "source");
@@ -45,7 +46,9 @@ protected:
         }
     }
 
-    Session session{"cp"};
+    Progress progress;
+    FileCopier const copier{progress, {}};
+    WorkerContext context{std::vector<char>(16), {}};
     std::shared_ptr<Source> const sourceStore = std::make_shared<Source>();
     std::shared_ptr<MinimalProvider> const targetStore = std::make_shared<MinimalProvider>();
     Place const source{provider::StorageItem(sourceStore, provider::StorageIRI(u"s://h/f")), "source"};

@@ -50,14 +50,16 @@ TEST_F(Interrupt, LeavesNothingOfANewFile)
 {
     ProgramResult const result = interrupt({"cp", "big", "t"}, SIGINT);
     EXPECT_EQ(result.status, 130);
-    EXPECT_EQ(result.errors, "storage: cp: interrupted\n");
+    EXPECT_EQ(result.errors, "storage: cp: interrupted: 0 of 1 file copied, 0 B\n");
     EXPECT_EQ(countEntries("t"), 0U);
 }
 
 TEST_F(Interrupt, TellsWhatWasDoneBefore)
 {
     folder.write("a", "content");
-    EXPECT_EQ(interrupt({"cp", "-v", "a", "big", "t"}, SIGINT, "t", "a").output, "a -> t/a\n");
+    ProgramResult const result = interrupt({"cp", "-v", "a", "big", "t"}, SIGINT, "t", "a");
+    EXPECT_EQ(result.output, "a -> t/a\n");
+    EXPECT_EQ(result.errors, "storage: cp: interrupted: 1 of 2 files copied, 7 B\n");
     EXPECT_EQ(countEntries("t"), 1U);
 }
 
@@ -77,7 +79,7 @@ TEST_F(Interrupt, EndsARecursiveCopy)
     makeFolder("t/d");
     ProgramResult const result = interrupt({"cp", "-r", "d", "t"}, SIGINT, "t/d");
     EXPECT_EQ(result.status, 130);
-    EXPECT_EQ(result.errors, "storage: cp: interrupted\n");
+    EXPECT_EQ(result.errors, "storage: cp: interrupted: 0 of 1 file copied, 0 B\n");
     EXPECT_EQ(countEntries("t/d"), 0U);
 }
 
@@ -100,6 +102,69 @@ TEST_F(Interrupt, EndsAtOnceWhileNobodyReadsTheOutput)
     EXPECT_EQ(result.status, 130);
     EXPECT_EQ(result.errors, "storage: cat: interrupted\n");
     ::close(pipe);
+}
+
+TEST_F(Interrupt, TellsOfFilesThatWereDoneAfterOneThatWasNot)
+{
+    folder.write("z", "content");
+    ProgramResult const result = interrupt({"cp", "-v", "-j2", "big", "z", "t"}, SIGINT, "t", "z");
+    EXPECT_EQ(result.output, "z -> t/z\n");
+    EXPECT_EQ(result.errors, "storage: cp: interrupted: 1 of 2 files copied, 7 B\n");
+}
+
+TEST_F(Interrupt, EndsEveryCopyThatIsUnderWay)
+{
+    folder.write("big2", "");
+    std::filesystem::resize_file(folder / "big2", std::uintmax_t{64} << 30U);
+    ProgramResult const result = interrupt({"cp", "-j2", "big", "big2", "t"}, SIGTERM);
+    EXPECT_EQ(result.status, 143);
+    EXPECT_EQ(result.errors, "storage: cp: interrupted: 0 of 2 files copied, 0 B\n");
+    EXPECT_EQ(countEntries("t"), 0U);
+}
+
+TEST_F(Interrupt, LeavesASourceThatIsMovedByCopying)
+{
+    makeFolder("other");
+    if (!mount("other", "1m"))
+        GTEST_SKIP() << "file systems may not be mounted here";
+    ProgramResult const result = interrupt({"mv", "big", "other"}, SIGINT, "other");
+    EXPECT_EQ(result.status, 130);
+    EXPECT_EQ(result.errors, "storage: mv: interrupted: 0 of 1 moved; 0 files copied, 0 B\n");
+    EXPECT_TRUE(exists("big"));
+    EXPECT_EQ(countEntries("other"), 0U);
+}
+
+/// Copies in place, of which nothing but the target itself is seen.
+class InterruptInPlace : public Interrupt
+{
+protected:
+    ProgramResult interruptInPlace(Arguments const& arguments) const
+    {
+        Process process(command(arguments), inFolder());
+        auto const deadline = std::chrono::steady_clock::now() + 60s;
+        auto const isCopying = [&] { return isFile("t/big") && folder.read("t/big").empty(); };
+        while (!isCopying() && process.isRunning() && std::chrono::steady_clock::now() < deadline)
+            std::this_thread::yield();
+        EXPECT_TRUE(isCopying());
+        process.send(SIGINT);
+        return process.finish();
+    }
+};
+
+TEST_F(InterruptInPlace, LeavesNothingOfANewFile)
+{
+    ProgramResult const result = interruptInPlace({"cp", "--in-place", "big", "t"});
+    EXPECT_EQ(result.errors, "storage: cp: interrupted: 0 of 1 file copied, 0 B\n");
+    EXPECT_EQ(countEntries("t"), 0U);
+}
+
+TEST_F(InterruptInPlace, TellsThatAnOldFileIsIncomplete)
+{
+    folder.write("t/big", "old");
+    ProgramResult const result = interruptInPlace({"cp", "--in-place", "--replace", "big", "t"});
+    EXPECT_EQ(result.status, 130);
+    EXPECT_EQ(result.errors, "storage: cp: t/big: incomplete, because it was being written in place\n"
+                             "storage: cp: interrupted: 0 of 1 file copied, 0 B\n");
 }
 
 } // namespace
