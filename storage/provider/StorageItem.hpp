@@ -83,15 +83,17 @@ public:
     /// Within one provider the copy is the provider's own, where it can do what `options` ask; else the bytes pass
     /// through a buffer of 1 MiB. With `Atomic` the destination changes only once the copy is complete, and then at
     /// once; with `NonAtomic` a failure or an interruption leaves a partial file. The interrupt function is asked after
-    /// each chunk, never before the first. Errors: `ResourceAlreadyExists` naming the destination, before anything is
-    /// opened, for a folder there, and under `Preserve` and `NoClobber` for a file; `IOError` naming this item when
-    /// reading fails, the destination when writing does; other stream failures by their own code, naming this item.
+    /// each chunk, never before the first; it is called where it is, not copied. Errors: `ResourceAlreadyExists` naming
+    /// the destination, before anything is opened, for a folder there, and under `Preserve` and `NoClobber` for a file;
+    /// `IOError` naming this item when reading fails, the destination when writing does; other stream failures by their
+    /// own code, naming this item.
     TransactionStatus copyFile(StorageItem const& destination, CopyFileOptions const& options) const;
 
     /// The same, neither all-or-nothing nor interruptible.
     TransactionStatus copyFile(StorageItem const& destination, ReplacementPolicy const& policy) const;
 
-    /// The steps of a buffered copy. Reads once, up to 1 MiB; answers how many bytes, 0 at the end of the data.
+    /// The steps of a buffered copy. Reads once, up to 1 MiB; answers how many bytes, 0 at the end of the data. A
+    /// stream that answers an impossible count has failed.
     long copyToBuffer(ByteStreamDevice const& source, std::vector<char>& buffer) const;
 
     /// Writes `count` bytes of the buffer to a `ByteStreamDevice` or a `TransactionalStreamDevice` at once; what is not

@@ -59,9 +59,9 @@ long checked(Step const& step, Accept const& accept, StorageItem const& item)
 
 TransactionStatus StorageItem::copyFile(StorageItem const& destination, CopyFileOptions const& options) const
 {
-    requireReplaceable(destination, options.replacementPolicy);
     bool const atomic = options.transactionPolicy == TransactionPolicy::Atomic;
     bool const interruptible = static_cast<bool>(options.interruptFunction);
+    requireReplaceable(destination, options.replacementPolicy);
     if (hasSameProviderInstance(destination)) {
         if (!atomic && !interruptible) {
             provider_->copyFile(location_, destination.location_, options.replacementPolicy);
@@ -74,7 +74,8 @@ TransactionStatus StorageItem::copyFile(StorageItem const& destination, CopyFile
     try {
         std::unique_ptr<ByteStream> stream = openReadOnlyStream();
         ByteStreamDevice const source(stream);
-        IProvider::Interrupt const interrupt = interruptible ? options.interruptFunction : neverInterrupt;
+        IProvider::Interrupt const never = neverInterrupt;
+        IProvider::Interrupt const& interrupt = interruptible ? options.interruptFunction : never;
         TransactionStatus const status =
             atomic ? bufferedTransactionalCopy(source, destination, destinationOptions, interrupt)
                    : bufferedCopy(source, destination, destinationOptions, interrupt);
@@ -93,8 +94,9 @@ TransactionStatus StorageItem::copyFile(StorageItem const& destination, Replacem
 long StorageItem::copyToBuffer(ByteStreamDevice const& source, std::vector<char>& buffer) const
 {
     long const capacity = static_cast<long>(std::min(buffer.size(), bufferSize));
-    long const count = checked([&] { return source.read(buffer.data(), capacity); },
-                               [&](long read) { return read != 0 || capacity == 0; }, *this);
+    long const count =
+        checked([&] { return source.read(buffer.data(), capacity); },
+                [&](long read) { return read == -1 || (std::min(1L, capacity) <= read && read <= capacity); }, *this);
     return std::max(count, 0L);
 }
 

@@ -16,4 +16,14 @@ std::size_t locksOf(Action action)
     return locks() - before;
 }
 
+/// While one lives, the next mutex that this thread locks fails with the given error number, once. One at a time.
+class FailingLock
+{
+public:
+    explicit FailingLock(int error);
+    FailingLock(FailingLock const&) = delete;
+    FailingLock& operator=(FailingLock const&) = delete;
+    ~FailingLock();
+};
+
 } // namespace foundation::tests::support

@@ -1,10 +1,14 @@
 #include <storage/provider/StorageIRI.hpp>
 
+#include <storage/provider/StorageItem.hpp>
+#include <tests/support/RecordingByteStream.hpp>
+#include <tests/support/RecordingProvider.hpp>
 #include <tests/support/allocations.hpp>
 
 #include <gtest/gtest.h>
 
 #include <cstddef>
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -78,6 +82,28 @@ TEST(Allocation, CopyAndRepeatedQueryForARelativeNeedNone)
         static_cast<void>(location.getPath());
         EXPECT_EQ(allocationsOf([&] { static_cast<void>(location.hasParent()); }), 0u);
     }
+}
+
+std::size_t allocationsOfCopyInChunks(int chunks, TransactionPolicy policy)
+{
+    tests::support::CallLog log;
+    auto const source = std::make_shared<tests::support::RecordingProvider>(log);
+    auto const target = std::make_shared<tests::support::RecordingProvider>(log);
+    source->when("doOpenReadOnlyStream", [chunks]() -> std::unique_ptr<ByteStream> {
+        auto stream = std::make_unique<tests::support::RecordingByteStream>();
+        stream->onRead = [left = chunks](char*, long count) mutable { return left-- > 0 ? count : -1L; };
+        return stream;
+    });
+    StorageItem const from(source, locations().front());
+    StorageItem const to(target, locations().front());
+    CopyFileOptions const options{ReplacementPolicy::Overwrite, policy, [] { return InterruptSignal::Continue; }};
+    return allocationsOf([&] { from.copyFile(to, options); });
+}
+
+TEST(Allocation, CopyBetweenItemsNeedsOneBufferHoweverManyChunksThereAre)
+{
+    for (TransactionPolicy const policy : {TransactionPolicy::Atomic, TransactionPolicy::NonAtomic})
+        EXPECT_EQ(allocationsOfCopyInChunks(1, policy), allocationsOfCopyInChunks(5, policy));
 }
 
 TEST(Allocation, PathViewNeedsNone)

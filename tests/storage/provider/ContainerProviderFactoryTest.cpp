@@ -6,8 +6,12 @@
 
 #include <gtest/gtest.h>
 
+#include <functional>
 #include <memory>
+#include <stdexcept>
+#include <string>
 #include <type_traits>
+#include <utility>
 
 namespace foundation::storage::provider {
 namespace {
@@ -39,25 +43,37 @@ struct Opened : ContainerProviderFactory
 class FileFactory : public ContainerProviderFactory
 {
 public:
-    mutable std::shared_ptr<ConfigurableProvider> last;
+    mutable ConfigurableProvider* last = nullptr; ///< valid while somebody holds it
     mutable int built = 0;
+    std::function<void()> onBuild = [] {};
+    std::function<void()> onKey = [] {};
 
 protected:
     std::shared_ptr<IProvider> doBuildProvider(StorageItem const& container) const override
     {
         EXPECT_TRUE(container.fileExists());
         ++built;
-        return last = std::make_shared<ConfigurableProvider>();
+        onBuild();
+        auto provider = std::make_shared<ConfigurableProvider>();
+        last = provider.get();
+        return provider;
     }
-    StorageIRI doGetKey(StorageItem const& container) const override { return container.getLocation(); }
+    StorageIRI doGetKey(StorageItem const& container) const override
+    {
+        onKey();
+        return container.getLocation();
+    }
 };
 
 struct Container
 {
-    Container() { provider->put(item.getLocation(), "content"); }
+    explicit Container(std::u16string const& location = u"s://h/container") : item(provider, StorageIRI(location))
+    {
+        provider->put(item.getLocation(), "content");
+    }
 
     std::shared_ptr<MinimalProvider> provider = std::make_shared<MinimalProvider>();
-    StorageItem item{provider, StorageIRI(u"s://h/container")};
+    StorageItem item;
 };
 
 TEST(ContainerProviderFactory, BuildingIsTheFirstSlotAfterTheDestructorAndTheKeyTheNext)
@@ -78,6 +94,41 @@ TEST(ContainerProviderFactory, OneContainerHasOneLiveProvider)
     auto const first = factory.buildProvider(container.item);
     EXPECT_EQ(factory.buildProvider(container.item), first);
     EXPECT_EQ(factory.built, 1);
+}
+
+TEST(ContainerProviderFactory, ProviderThatNobodyHoldsIsBuiltAnew)
+{
+    Container const container;
+    FileFactory const factory;
+    std::weak_ptr<IProvider> const first = factory.buildProvider(container.item);
+    EXPECT_TRUE(first.expired());
+    EXPECT_NE(factory.buildProvider(container.item), nullptr);
+    EXPECT_EQ(factory.built, 2);
+}
+
+TEST(ContainerProviderFactory, FailingBuilderPassesAndNothingIsKept)
+{
+    Container const container;
+    FileFactory factory;
+    factory.onBuild = [] { throw std::domain_error("not built"); };
+    EXPECT_THROW((void)factory.buildProvider(container.item), std::domain_error);
+    factory.onBuild = [] {};
+    EXPECT_NE(factory.buildProvider(container.item), nullptr);
+    EXPECT_EQ(factory.built, 2);
+}
+
+TEST(ContainerProviderFactory, KeyIsAskedForBeforeTheLockIsTaken)
+{
+    Container const outer;
+    Container const inner(u"s://h/inner");
+    FileFactory factory;
+    bool nested = false;
+    factory.onKey = [&] {
+        if (!std::exchange(nested, true)) {
+            EXPECT_NE(factory.buildProvider(inner.item), nullptr);
+        }
+    };
+    EXPECT_NE(factory.buildProvider(outer.item), nullptr);
 }
 
 TEST(ContainerProviderFactory, ProvidersAreNeverConfigured)

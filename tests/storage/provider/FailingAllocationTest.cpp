@@ -3,6 +3,7 @@
 #include <storage/provider.hpp>
 
 #include <storage/provider/detail/Lazy.hpp>
+#include <tests/support/ConfigurableProvider.hpp>
 #include <tests/support/MinimalProvider.hpp>
 #include <tests/support/RecordingByteStream.hpp>
 #include <tests/support/allocations.hpp>
@@ -151,6 +152,50 @@ TEST(FailingAllocation, DuringACopyLeavesTheSource)
                                              [&] { EXPECT_EQ(store.content(here), "content"); });
     EXPECT_GT(failures, 0u);
     EXPECT_EQ(store.content(target), "content");
+}
+
+TEST(FailingAllocation, DuringAnAtomicCopyBetweenItemsLeavesTheTarget)
+{
+    auto const first = std::make_shared<MinimalProvider>();
+    auto const second = std::make_shared<MinimalProvider>();
+    first->put(here, "new");
+    second->folders = {here.getParent()};
+    second->put(here, "old");
+    CopyFileOptions const options{ReplacementPolicy::Overwrite, TransactionPolicy::Atomic, {}};
+    std::size_t const failures = tests::support::failEachAllocationOf(
+        [&] { StorageItem(first, here).copyFile(StorageItem(second, here), options); },
+        [&] { EXPECT_EQ(second->content(here), "old"); });
+    EXPECT_GT(failures, 0u);
+    EXPECT_EQ(second->content(here), "new");
+}
+
+/// Keeps sight of what it built.
+class WatchingFactory : public PhysicalProviderFactory
+{
+public:
+    mutable std::weak_ptr<IProvider> last;
+
+protected:
+    std::shared_ptr<IProvider> doBuildProvider(StorageIRI const&) const override
+    {
+        auto provider = std::make_shared<ConfigurableProvider>();
+        last = provider;
+        return provider;
+    }
+    StorageIRI doGetKey(StorageIRI const& location) const override { return location; }
+};
+
+TEST(FailingAllocation, WhileAProviderIsBuiltKeepsNothingOfIt)
+{
+    WatchingFactory factory;
+    boost::property_tree::ptree tree;
+    tree.put("a key with a long name", "a value that is long");
+    factory.configure(tree);
+    std::shared_ptr<IProvider> provider;
+    std::size_t const failures = tests::support::failEachAllocationOf([&] { provider = factory.buildProvider(here); },
+                                                                      [&] { EXPECT_TRUE(factory.last.expired()); });
+    EXPECT_GT(failures, 1u);
+    EXPECT_EQ(factory.buildProvider(here), provider);
 }
 
 TEST(FailingAllocation, DuringAnAbortedWriteLeavesTheTarget)

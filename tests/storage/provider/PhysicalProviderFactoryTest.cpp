@@ -3,6 +3,7 @@
 #include <storage/provider/IConfigurableProvider.hpp>
 #include <tests/support/ConfigurableProvider.hpp>
 #include <tests/support/MinimalProvider.hpp>
+#include <tests/support/inThreads.hpp>
 #include <tests/support/slotOf.hpp>
 
 #include <gtest/gtest.h>
@@ -13,7 +14,6 @@
 #include <set>
 #include <stdexcept>
 #include <string>
-#include <thread>
 #include <type_traits>
 #include <vector>
 
@@ -119,6 +119,7 @@ TEST(PhysicalProviderFactory, MissingProviderIsAnsweredAndAskedForAgain)
     EXPECT_EQ(factory.buildProvider(a), nullptr);
     EXPECT_EQ(factory.buildProvider(a), nullptr);
     EXPECT_EQ(factory.built, 2);
+    factory.configure(tree("2"));
     factory.shutdownProvider();
 }
 
@@ -271,6 +272,38 @@ TEST(PhysicalProviderFactory, ShutdownReachesTheLiveInKeyOrderAndKeepsThem)
     EXPECT_EQ(factory.buildProvider(a), first);
 }
 
+TEST(PhysicalProviderFactory, ProviderThatLosesItsLastUserMeanwhileLivesUntilItIsDone)
+{
+    ConfigurableFactory factory;
+    auto provider = factory.buildProvider(a);
+    std::weak_ptr<IProvider> const watch = provider;
+    auto const letGo = [&] {
+        provider.reset();
+        EXPECT_FALSE(watch.expired());
+    };
+    factory.providers[0]->onConfigure = [&](auto&) { letGo(); };
+    factory.configure(tree("1"));
+    EXPECT_TRUE(watch.expired());
+
+    provider = factory.buildProvider(b);
+    std::weak_ptr<IProvider> const other = provider;
+    factory.providers[1]->onShutdown = [&] {
+        provider.reset();
+        EXPECT_FALSE(other.expired());
+    };
+    factory.shutdownProvider();
+    EXPECT_TRUE(other.expired());
+}
+
+TEST(PhysicalProviderFactory, ShutDownProvidersAreStillConfigured)
+{
+    ConfigurableFactory factory;
+    auto const provider = factory.buildProvider(a);
+    factory.shutdownProvider();
+    factory.configure(tree("1"));
+    EXPECT_EQ(factory.providers[0]->trees, std::vector{tree("1")});
+}
+
 TEST(PhysicalProviderFactory, FirstFailureEndsShutdown)
 {
     bool reached = false;
@@ -294,20 +327,33 @@ TEST(PhysicalProviderFactoryConcurrency, ManyThreadsBuildingOneKeyGetOneProvider
     constexpr int threads = 32;
     for (int round = 0; round != 20; ++round) {
         RootFactory const factory;
-        std::atomic<int> waiting{threads};
         std::vector<std::shared_ptr<IProvider>> results(threads);
-        std::vector<std::thread> workers;
-        for (auto& result : results)
-            workers.emplace_back([&] {
-                --waiting;
-                while (waiting != 0)
-                    std::this_thread::yield();
-                result = factory.buildProvider(a);
-            });
-        for (auto& worker : workers)
-            worker.join();
+        inThreads(threads, [&](int i) { results[static_cast<std::size_t>(i)] = factory.buildProvider(a); });
         EXPECT_EQ(factory.built, 1);
         EXPECT_EQ(std::set(results.begin(), results.end()).size(), 1U);
+    }
+}
+
+TEST(PhysicalProviderFactoryConcurrency, EveryProviderHasTheLastConfigurationWhenAllAreDone)
+{
+    constexpr int builders = 6;
+    for (int round = 0; round != 20; ++round) {
+        ConfigurableFactory factory;
+        std::vector<std::shared_ptr<IProvider>> built(builders);
+        inThreads(builders + 2, [&](int i) {
+            if (i < builders) {
+                StorageIRI const location(StorageIRI(u"s://h/"),
+                                          std::u16string(1, static_cast<char16_t>(u'a' + i / 2)));
+                built[static_cast<std::size_t>(i)] = factory.buildProvider(location);
+            } else if (i == builders) {
+                for (int version = 0; version != 10; ++version)
+                    factory.configure(tree(std::to_string(version)));
+            } else {
+                factory.shutdownProvider();
+            }
+        });
+        for (ConfigurableProvider const* const provider : factory.providers)
+            EXPECT_EQ(provider->trees.back(), tree("9"));
     }
 }
 
