@@ -119,7 +119,8 @@ TEST_F(Put, InPlaceKeepsTheFileAndItsLinks)
     folder.write("a", "a longer old content");
     std::filesystem::create_hard_link(folder / "a", folder / "b");
     makeLink("a", "c");
-    putWell("new", {"put", "--in-place", "c"});
+    putFailing({"put", "--in-place", "c"}, "storage: put: c: exists already (--replace replaces it)\n");
+    putWell("new", {"put", "--in-place", "--replace", "c"});
     EXPECT_EQ(folder.read("b"), "new");
     EXPECT_FALSE(isFile("c"));
     EXPECT_EQ(countEntries(), 3U);
@@ -129,6 +130,26 @@ TEST_F(Put, InPlaceMakesANewFile)
 {
     putWell("new", {"put", "--in-place", "a"});
     EXPECT_EQ(folder.read("a"), "new");
+}
+
+TEST_F(Put, InPlaceLeavesNothingOfANewFileThatFails)
+{
+    makeFolder("t");
+    ProcessOptions options = inFolder();
+    options.input = folder / "t";
+    EXPECT_EQ(runProgram(command({"put", "--in-place", "a"}), options).status, 1);
+    EXPECT_FALSE(exists("a"));
+}
+
+TEST_F(Put, InPlaceTellsThatAnExistingFileIsLeftIncomplete)
+{
+    folder.write("a", "old");
+    ProcessOptions options = inFolder();
+    options.input = folder.path();
+    ProgramResult const result = runProgram(command({"put", "--in-place", "--replace", "a"}), options);
+    EXPECT_EQ(result.status, 1);
+    EXPECT_EQ(result.errors, "storage: put: a: incomplete, because it was being written in place\n"
+                             "storage: put: standard input: Is a directory\n");
 }
 
 TEST_F(Put, RefusesWhatIsNoFile)
