@@ -12,9 +12,9 @@ Misbehaviour opening(Transaction (*open)(Store, Iri, Options))
     return {.openTransactionalStream = open};
 }
 
-Misbehaviour const losingTheLastByte{.write = withoutTheLastByte};
+constexpr Misbehaviour losingTheLastByte{.write = withoutTheLastByte};
 
-Misbehaviour const makingWhatIsAskedFor{.fileExists = [](Store s, Iri i) {
+constexpr Misbehaviour makingWhatIsAskedFor{.fileExists = [](Store s, Iri i) {
     bool const before = s.fileExists(i);
     swallowed([&] { s.createFile(i); });
     return before;
