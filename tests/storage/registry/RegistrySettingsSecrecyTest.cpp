@@ -54,11 +54,11 @@ ptree settings()
     }
 }
 
-/// What a provider meets that reads a number where a password stands.
+/// What a property tree throws where a number is read and a password stands: it carries the value.
 [[noreturn]] void throwFromTheTree()
 {
-    static_cast<void>(settings().get<int>("s.password"));
-    throw std::logic_error("a password was read as a number");
+    throw boost::property_tree::ptree_bad_data("conversion of data to type \"i\" failed",
+                                               settings().get<std::string>("s.password"));
 }
 
 [[noreturn]] void throwAText()
