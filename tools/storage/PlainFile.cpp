@@ -8,9 +8,13 @@ using provider::ErrorCode;
 
 namespace {
 
-constexpr provider::ByteStreamOpenOptions emptied{
-    provider::ByteStreamAccess::WriteOnly, provider::ByteStreamCreate::NeverCreate,
-    provider::ByteStreamTruncate::TruncateExisting, provider::ByteStreamAppend::Overwrite};
+/// A new file is empty, and is not emptied: ext4 writes a file that was emptied to the disk when it is closed.
+provider::ByteStreamOpenOptions openOptions(bool isNew)
+{
+    return {provider::ByteStreamAccess::WriteOnly, provider::ByteStreamCreate::NeverCreate,
+            isNew ? provider::ByteStreamTruncate::PreserveExisting : provider::ByteStreamTruncate::TruncateExisting,
+            provider::ByteStreamAppend::Overwrite};
+}
 
 /// Answers false where a file stands that may be replaced.
 bool makeFile(provider::StorageItem const& target, Replace replace)
@@ -31,7 +35,7 @@ PlainFile::PlainFile(provider::StorageItem const& target, Replace replace)
     : TargetFile(target), isNew_(makeFile(target, replace))
 {
     try {
-        stream_ = target.openStream(emptied);
+        stream_ = target.openStream(openOptions(isNew_));
     } catch (...) {
         isFinished_ = !isNew_;
         discard();
