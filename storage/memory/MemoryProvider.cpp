@@ -163,9 +163,10 @@ void MemoryProvider::doPublishFolderEventsFor(StorageIRI const& folder, ChangeEv
 void MemoryProvider::doPublishFileEventsFor(StorageIRI const& file, ChangeEventCallback const& callback,
                                             EventKinds const& kinds) const
 {
-    if (!callback || tree_->exists(file.getParent()) != ExistenceType::AsFolder)
+    std::u16string path = tree_->canonicalPath(file);
+    if (!callback || !file.hasParent() || tree_->exists(file.getParent()) != ExistenceType::AsFolder)
         throw ChangeEventsSubscriptionException(file);
-    tree_->subscriptions().add(tree_->canonicalPath(file), Subscriptions::Scope::Entry, callback, kinds);
+    tree_->subscriptions().add(std::move(path), Subscriptions::Scope::Entry, callback, kinds);
 }
 
 void MemoryProvider::doStopPublishingEventsFor(StorageIRI const& folder) const

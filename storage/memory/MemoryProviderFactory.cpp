@@ -9,7 +9,7 @@ using provider::StorageIRI;
 
 std::shared_ptr<provider::IProvider> MemoryProviderFactory::doBuildProvider(StorageIRI const& location) const
 {
-    std::u16string const authority(detail::authorityOf(location));
+    std::u16string const authority(detail::authorityOf(detail::rootOf(location)));
     std::shared_ptr<detail::Tree>& tree = trees_[authority];
     if (tree == nullptr)
         tree = std::make_shared<detail::Tree>(location);

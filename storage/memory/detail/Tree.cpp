@@ -52,7 +52,7 @@ bool isProtected(Folder const* folder)
 std::u16string_view authorityOf(StorageIRI const& iri)
 {
     std::u16string_view text = iri.toString();
-    if (!hasScheme(text) || text.find_first_of(u"?#") != std::u16string_view::npos)
+    if (!hasScheme(text) || iri.hasInnerIRI() || text.find_first_of(u"?#") != std::u16string_view::npos)
         throw Exception(ErrorCode::InvalidLocation, iri);
     text.remove_prefix(4);
     if (!text.starts_with(u"//"))
@@ -63,7 +63,9 @@ std::u16string_view authorityOf(StorageIRI const& iri)
 
 StorageIRI rootOf(StorageIRI const& iri)
 {
-    return StorageIRI(u"mem://" + std::u16string(authorityOf(iri)) + u"/");
+    authorityOf(iri); // refuses what is no place in a tree
+    StorageIRI const root(iri, u"/");
+    return StorageIRI(u"mem://" + std::u16string(authorityOf(root)) + u"/");
 }
 
 void requireWritable(Folder const& folder, StorageIRI const& iri)
@@ -72,11 +74,14 @@ void requireWritable(Folder const& folder, StorageIRI const& iri)
         throw Exception(ErrorCode::PermissionDenied, iri);
 }
 
-Tree::Tree(StorageIRI const& iri) : authority_(authorityOf(iri)), root_(rootOf(iri)), rootNode_(Folder::create()) {}
+Tree::Tree(StorageIRI const& iri)
+    : authority_(authorityOf(rootOf(iri))), root_(rootOf(iri)), rootNode_(Folder::create())
+{}
 
 std::u16string_view Tree::pathOf(StorageIRI const& iri) const
 {
-    if (authorityOf(iri) != authority_)
+    // The second comparison is dear, and needed only where the authority is written in another way.
+    if (authorityOf(iri) != authority_ && rootOf(iri) != root_)
         throw Exception(ErrorCode::InvalidLocation, iri);
     std::u16string_view const path = iri.getPath();
     if (!path.starts_with(u'/') || path.find(u'\0') != std::u16string_view::npos)

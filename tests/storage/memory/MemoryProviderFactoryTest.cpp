@@ -36,6 +36,30 @@ TEST(MemoryProviderFactory, KeysByTheRootOfTheAuthority)
     EXPECT_EQ(factory.getKey(StorageIRI(u"mem://u@a:1/x")).toString(), u"mem://u@a:1/");
 }
 
+/// Locations that are made of others write it in the one way, whatever these were.
+TEST(MemoryProviderFactory, TakesAllWaysToWriteAnAuthorityForOne)
+{
+    MemoryProviderFactory const factory;
+    for (std::u16string const authority : {u"%41b:80", u"h:080", u"h:", u"a%c3%a9", u"u%2Dv@h%2Fi", u"[::1]:01"}) {
+        StorageIRI const written(u"mem://" + authority + u"/folder");
+        StorageIRI const made(written, u"/folder");
+        auto const provider = factory.buildProvider(written);
+        provider->createFolder(written);
+        EXPECT_TRUE(provider->folderExists(made)) << made;
+        EXPECT_NO_THROW(provider->createFolderRecursive(StorageIRI(written, u"a/b"))) << written;
+        EXPECT_EQ(factory.getKey(made), factory.getKey(written));
+        EXPECT_EQ(factory.buildProvider(made), provider) << made;
+    }
+}
+
+TEST(MemoryProviderFactory, KeepsAuthoritiesOfOtherLetterCaseApart)
+{
+    MemoryProviderFactory const factory;
+    auto const provider = factory.buildProvider(StorageIRI(u"mem://%41/"));
+    EXPECT_EQ(factory.buildProvider(StorageIRI(u"mem://A/")), provider);
+    EXPECT_NE(factory.buildProvider(StorageIRI(u"mem://a/")), provider);
+}
+
 TEST(MemoryProviderFactory, ServesLocationsMadeOfPaths)
 {
     MemoryProviderFactory const factory;
@@ -60,7 +84,7 @@ TEST(MemoryProviderFactory, KeepsStoresApart)
 TEST(MemoryProviderFactory, RefusesForeignLocations)
 {
     MemoryProviderFactory const factory;
-    for (char16_t const* const text : {u"file:///a", u"mem://a/b?c", u"zip:mem://a/b.zip!/c"}) {
+    for (char16_t const* const text : {u"file:///a", u"mem://a/b?c", u"zip:mem://a/b.zip!/c", u"mem:mem:///b.zip!/c"}) {
         StorageIRI const iri(text);
         EXPECT_EQ(failureOf([&] { factory.buildProvider(iri); }), failure(ErrorCode::InvalidLocation, iri));
         EXPECT_EQ(failureOf([&] { static_cast<void>(factory.getKey(iri)); }), failure(ErrorCode::InvalidLocation, iri));

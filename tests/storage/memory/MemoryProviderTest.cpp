@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <storage/provider/ChangeEventExceptions.hpp>
 #include <storage/provider/StorageItem.hpp>
 #include <tests/storage/memory/MemoryStore.hpp>
 
@@ -502,6 +503,17 @@ TEST(MemoryProvider, CanBeUsedAfterItsShutdown)
     EXPECT_EQ(store.read(u"/file"), "content");
     store.createFolder(at(u"/folder"));
     EXPECT_TRUE(store.folderExists(at(u"/folder")));
+}
+
+TEST(MemoryProvider, RefusesToTellOfAFileThatCannotBe)
+{
+    MemoryStore const store;
+    auto const ignore = [](auto&&...) {};
+    EXPECT_THROW(store.publishFileEventsFor(at(u"/"), ignore, {events::Kind::Created}),
+                 ChangeEventsSubscriptionException);
+    EXPECT_EQ(
+        failureOf([&] { store.publishFileEventsFor(StorageIRI(u"mem://test"), ignore, {events::Kind::Created}); }),
+        failure(ErrorCode::InvalidLocation, StorageIRI(u"mem://test")));
 }
 
 } // namespace
