@@ -40,6 +40,16 @@ StorageIRI rootOf(std::u16string_view scheme)
     return StorageIRI(std::u16string(scheme) + u":/");
 }
 
+/// Redacts behind every "//": a text that is no location has no path that could hold such words by right.
+std::u16string redactEverywhere(std::u16string text)
+{
+    for (std::size_t at = text.find(u"//"); at != std::u16string::npos; at = text.find(u"//", at + 1)) {
+        if (hasPassword(std::u16string_view(text).substr(at)))
+            text.replace(at, std::u16string::npos, redactPassword(text.substr(at)));
+    }
+    return text;
+}
+
 /// Throws what is left of the exception in flight when nothing that it says may be repeated.
 [[noreturn]] void rethrowWithoutWords(StorageIRI const& location)
 {
@@ -181,7 +191,10 @@ StorageIRI Registry::parse(std::u16string const& text) const
         return StorageIRI(text);
     } catch (std::exception const&) {
         requireServedSchemes(text);
-        throw;
+        std::u16string const redacted = redactEverywhere(text);
+        if (redacted == text)
+            throw;
+        throw OpenException(Reason::CredentialsInLocation, StorageIRI(redacted)); // which fails alike, as a rule
     }
 }
 

@@ -41,9 +41,13 @@ constexpr char16_t const* locations[] = {
 
 /// The same, in what is no location for other reasons too.
 constexpr char16_t const* brokenLocations[] = {
-    u"//u:canary@h/x",       u"no scheme://u:canary@h/x",  u"zip:s://u:canary@h/a.zip", u"zip:s://u:canary@h/a.zip!x",
-    u"s://u:canary@h:99999", u"s://u:canary@h/x\xD800",    u"s:a//u:canary@h/x",        u"s://u:12345678/canary@h",
-    u"x y:s://u:canary@h/a", u"zip:a b://u:canary@h/c!/d",
+    u"//u:canary@h/x",           u"no scheme://u:canary@h/x",
+    u"zip:s://u:canary@h/a.zip", u"zip:s://u:canary@h/a.zip!x",
+    u"s://u:canary@h:99999",     u"s://u:canary@h/x\xD800",
+    u"s:a//u:canary@h/x",        u"s://u:12345678/canary@h",
+    u"x y:s://u:canary@h/a",     u"zip:a b://u:canary@h/c!/d",
+    u"/s://u:canary@h/x",        u"./s:///u:canary@h/v//w:canary@i",
+    u"zip:s:/a//u:canary@h",
 };
 
 TEST_F(RegistryOfPasswords, AreRefusedInLocations)
