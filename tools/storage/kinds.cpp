@@ -14,7 +14,14 @@ Kind existingKindOf(Place const& place)
     Kind const kind = kindOf(place);
     if (kind == Kind::None)
         throw Failure{place.text(), describe(provider::ErrorCode::ResourceNotFound)};
+    requireKindAsSaid(place, kind);
     return kind;
+}
+
+void requireKindAsSaid(Place const& place, Kind kind)
+{
+    if (place.saysFolder() && kind != Kind::None && !leadsToFolder(kind))
+        throw Failure{place.text(), "not a folder, as the slash at the end says"};
 }
 
 void requireParentFolder(Place const& place)

@@ -10,8 +10,11 @@ using Kind = provider::ExistenceTypeExtended;
 /// What a place holds; failures name it.
 Kind kindOf(Place const& place);
 
-/// The same, where nothing is a failure.
+/// The same, where nothing is a failure, and anything but a folder too if the place says that it is one.
 Kind existingKindOf(Place const& place);
+
+/// Throws `Failure` for anything but a folder at a place that says that it is one: `a/` is not the file `a`.
+void requireKindAsSaid(Place const& place, Kind kind);
 
 /// Throws `Failure` unless the folder is there that holds the place, or is to hold it.
 void requireParentFolder(Place const& place);

@@ -2,6 +2,7 @@
 #include <tools/storage/arguments.hpp>
 #include <tools/storage/commands.hpp>
 #include <tools/storage/describe.hpp>
+#include <tools/storage/kinds.hpp>
 
 #include <memory>
 #include <storage/provider/Exception.hpp>
@@ -17,15 +18,20 @@ struct Options
 };
 
 /// A folder that somebody else makes meanwhile is as good.
-void makeWithParents(provider::StorageItem const& folder)
+void makeWithParents(Place const& folder)
 {
-    if (folder.folderExists())
+    if (folder.item().folderExists())
         return;
     try {
-        folder.createFolderRecursive();
+        folder.item().createFolderRecursive();
     } catch (provider::Exception const& error) {
-        if (error.getErrorCode() != provider::ErrorCode::ResourceAlreadyExists || !folder.folderExists())
+        if (error.getErrorCode() != provider::ErrorCode::ResourceAlreadyExists)
             throw;
+        if (folder.item().folderExists())
+            return;
+        bool const isAbove = kindOf(folder) == Kind::None;
+        throw Failure{folder.text(),
+                      isAbove ? "something above it is not a folder" : "exists already, and is not a folder"};
     }
 }
 
@@ -42,7 +48,7 @@ void makeAlone(Place const& folder)
 
 void make(Options const& options, Place const& folder)
 {
-    at(folder, [&] { options.withParents ? makeWithParents(folder.item()) : makeAlone(folder); });
+    at(folder, [&] { options.withParents ? makeWithParents(folder) : makeAlone(folder); });
 }
 
 } // namespace

@@ -81,6 +81,13 @@ void requireCopied(Place const& source, Place const& copy, ptime const& start)
         throw Failure{source.text(), "changed while it was moved, and stays"};
 }
 
+/// What is moved there would be lost: the source is removed, and the copy goes with the command.
+void requireLasting(Place const& target)
+{
+    if (target.item().getScheme() == u"mem")
+        throw Failure{target.text(), "goes when the command ends, so that nothing is moved there"};
+}
+
 CopyRunOptions runOptions(Options const& options, Replace replace)
 {
     CopyRunOptions result;
@@ -211,6 +218,7 @@ void moveAll(Session& session, Options const& options)
     std::vector<std::string> sources = options.paths;
     Place target = session.stores().open(sources.back());
     sources.pop_back();
+    requireLasting(target);
     if (options.transfers.showsProgress)
         session.progress().showLines();
     Move(session, options, std::move(target)).moveAll(sources);

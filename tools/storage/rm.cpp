@@ -37,6 +37,7 @@ void remove(Session& session, Options const& options, Place const& place)
     Kind const kind = kindOf(place);
     if (kind == Kind::None && options.ignoresMissing)
         return;
+    requireKindAsSaid(place, kind);
     if (kind == Kind::RegularFolder) {
         requireRemovableFolder(options, place);
         TreeRemover(session).remove(place);

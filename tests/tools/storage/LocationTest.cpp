@@ -78,6 +78,38 @@ TEST_F(Location, IsCopiedFromOneStoreToAnother)
     EXPECT_EQ(runWell({"cp", "-v", "a", "mem:///b"}), "a -> mem:///b\n");
 }
 
+TEST_F(Location, InMemoryReceivesNoMove)
+{
+    folder.write("a", "content");
+    for (std::string const target : {"mem:///", "MEM:///b", "mem://host/b"})
+        runFailing({"mv", "a", target},
+                   "storage: mv: " + target + ": goes when the command ends, so that nothing is moved there\n");
+    EXPECT_EQ(folder.read("a"), "content");
+}
+
+TEST_F(Location, OfAFileEndsInNoSlash)
+{
+    folder.write("a", "content");
+    makeLink("a", "b");
+    makeFolder("t");
+    for (std::string const command : {"ls", "find", "du", "stat", "cat", "rm"})
+        for (std::string const& name : {std::string("a/"), std::string("b/"), "file://" + (folder / "a/").native()})
+            runFailing({command, name},
+                       "storage: " + command + ": " + name + ": not a folder, as the slash at the end says\n");
+    for (std::string const command : {"cp", "mv"})
+        runFailing({command, "a/", "t"}, "storage: " + command + ": a/: not a folder, as the slash at the end says\n");
+    EXPECT_EQ(folder.read("a"), "content");
+    EXPECT_EQ(countEntries("t"), 0U);
+}
+
+TEST_F(Location, OfALinkToAFolderMayEndInASlash)
+{
+    makeFolder("d");
+    folder.write("d/a", "content");
+    makeLink("d", "b");
+    EXPECT_EQ(runWell({"ls", "b/"}), "a\n");
+}
+
 TEST_F(Location, IsTheSameWhateverTheLetterCaseOfItsScheme)
 {
     folder.write("a", "content");

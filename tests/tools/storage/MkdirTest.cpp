@@ -33,8 +33,12 @@ TEST_F(Mkdir, MakesParentsWhenTold)
 TEST_F(Mkdir, WithParentsRefusesAFileInTheWay)
 {
     folder.write("a", "");
-    runFailing({"mkdir", "-p", "a"}, "storage: mkdir: a: exists already\n");
-    EXPECT_EQ(run({"mkdir", "-p", "a/b"}).status, 1);
+    makeLink("nowhere", "b");
+    runFailing({"mkdir", "-p", "a", "b", "a/b", "a/b/c"},
+               "storage: mkdir: a: exists already, and is not a folder\n"
+               "storage: mkdir: b: exists already, and is not a folder\n"
+               "storage: mkdir: a/b: something above it is not a folder\n"
+               "storage: mkdir: a/b/c: something above it is not a folder\n");
 }
 
 } // namespace
