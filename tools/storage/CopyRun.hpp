@@ -54,6 +54,9 @@ public:
     /// Has the file at `source` copied, sooner or later. Throws `Interrupted`.
     void copyFile(Place source, Place target, TargetState state);
 
+    /// What is copied from now on is of another folder than what was copied before.
+    void changeFolder() { workers_.beginGroup(); }
+
     /// Has a failure complained about when its turn has come. Throws `Interrupted`.
     void fail(Place const& source, Place const& target, Failure const& failure);
 

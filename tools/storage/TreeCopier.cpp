@@ -52,6 +52,7 @@ void TreeCopier::step()
         return;
     }
     levels_.leave();
+    run_.changeFolder();
 }
 
 /// What a listing calls a folder may be a link to one.
@@ -73,6 +74,7 @@ void TreeCopier::enter(Place const& source, Place const& target)
         requireCopyable(source);
         levels_.enter(source, target);
         levels_.innermost().isFresh = makeFolder(target);
+        run_.changeFolder();
     } catch (Failure const& failure) {
         if (levels_.depth() > depth)
             levels_.leave();

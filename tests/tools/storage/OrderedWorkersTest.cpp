@@ -1,11 +1,15 @@
 #include <tools/storage/OrderedWorkers.hpp>
 
 #include <algorithm>
+#include <array>
 #include <atomic>
+#include <barrier>
 #include <gtest/gtest.h>
 #include <latch>
 #include <numeric>
+#include <set>
 #include <stdexcept>
+#include <thread>
 
 namespace {
 
@@ -104,6 +108,52 @@ TEST_P(OrderedWorkersConcurrency, StopByReportingWhatWasDoneAndDroppingTheRest)
     hasBegun.wait();
     workers.stop();
     EXPECT_TRUE(reported.empty());
+}
+
+TEST(OrderedWorkersGroupsConcurrency, KeepThreadsApart)
+{
+    constexpr std::size_t jobsInAGroup = 50;
+    OrderedWorkers workers(2, &waitForNothing);
+    std::latch allAreAdded(1);
+    for (int thread = 0; thread < 2; ++thread) {
+        workers.beginGroup();
+        workers.add([&](WorkerContext&) {
+            allAreAdded.wait();
+            return waitForNothing;
+        });
+    }
+    std::barrier bothAreAtIt(2);
+    std::array<std::set<std::thread::id>, 2> threads;
+    for (std::set<std::thread::id>& ofGroup : threads) {
+        workers.beginGroup();
+        for (std::size_t i = 0; i < jobsInAGroup; ++i)
+            workers.add([&](WorkerContext&) {
+                ofGroup.insert(std::this_thread::get_id());
+                bothAreAtIt.arrive_and_wait();
+                return waitForNothing;
+            });
+    }
+    allAreAdded.count_down();
+    workers.finish();
+    EXPECT_EQ(threads[0].size(), 1U);
+    EXPECT_EQ(threads[1].size(), 1U);
+    EXPECT_NE(threads[0], threads[1]);
+}
+
+TEST(OrderedWorkersGroupsConcurrency, AreSharedWhenThereIsNoOther)
+{
+    OrderedWorkers workers(2, &waitForNothing);
+    std::barrier bothAreAtIt(2);
+    std::atomic<int> count = 0;
+    workers.beginGroup();
+    for (int i = 0; i < 10; ++i)
+        workers.add([&](WorkerContext&) {
+            bothAreAtIt.arrive_and_wait();
+            ++count;
+            return waitForNothing;
+        });
+    workers.finish();
+    EXPECT_EQ(count, 10);
 }
 
 TEST(OrderedWorkersStopConcurrency, TellsWhatWasDoneBehindWhatWasNot)
