@@ -2,11 +2,12 @@
 
 #include <storage/local/detail/LocalByteStream.hpp>
 #include <storage/local/detail/LocalListing.hpp>
+#include <storage/local/detail/Root.hpp>
+#include <storage/local/detail/Settings.hpp>
 #include <storage/local/detail/attributes.hpp>
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/fileSystem.hpp>
 #include <storage/local/detail/move.hpp>
-#include <storage/local/detail/nativePath.hpp>
 
 #include <cerrno>
 #include <optional>
@@ -20,10 +21,10 @@ using namespace detail;
 namespace {
 
 /// Nothing where nothing is.
-std::optional<Status> findStatus(std::string const& path, Links links, StorageIRI const& iri)
+std::optional<Status> findStatus(Root const& root, std::string const& path, Links links, StorageIRI const& iri)
 {
     Status status;
-    int const error = getStatus(path, links, status);
+    int const error = root.getStatus(path, links, status);
     if (meansMissing(error))
         return std::nullopt;
     if (error != 0)
@@ -31,43 +32,77 @@ std::optional<Status> findStatus(std::string const& path, Links links, StorageIR
     return status;
 }
 
-Status requireStatus(std::string const& path, StorageIRI const& iri)
+Status requireStatus(Root const& root, std::string const& path, StorageIRI const& iri)
 {
     Status status;
-    if (int const error = getStatus(path, Links::Follow, status))
+    if (int const error = root.getStatus(path, Links::Follow, status))
         throwError(error, iri);
     return status;
 }
 
-ExistenceTypeExtended typeOfLink(std::string const& path, StorageIRI const& iri)
+ExistenceTypeExtended typeOfLink(Root const& root, std::string const& path, StorageIRI const& iri)
 {
-    std::optional<Status> const target = findStatus(path, Links::Follow, iri);
+    std::optional<Status> const target = findStatus(root, path, Links::Follow, iri);
     if (!target)
         return ExistenceTypeExtended::BrokenSymlink;
     return isFolder(*target) ? ExistenceTypeExtended::SymlinkToFolder : ExistenceTypeExtended::SymlinkToFile;
 }
 
-bool isSameContent(StorageIRI const& left, StorageIRI const& right)
+bool isSameContent(Root const& root, StorageIRI const& left, StorageIRI const& right)
 {
     Status leftStatus;
     Status rightStatus;
-    return getStatus(nativePath(right), Links::Follow, rightStatus) == 0 &&
-           getStatus(nativePath(left), Links::Follow, leftStatus) == 0 && isSameFile(leftStatus, rightStatus) &&
+    return root.getStatus(root.pathOf(right), Links::Follow, rightStatus) == 0 &&
+           root.getStatus(root.pathOf(left), Links::Follow, leftStatus) == 0 && isSameFile(leftStatus, rightStatus) &&
            S_ISREG(leftStatus.stx_mode);
+}
+
+Located locate(Root const& root, std::string const& path, StorageIRI const& iri)
+{
+    Located entry;
+    if (int const error = root.locate(path, entry))
+        throwError(error, iri);
+    return entry;
 }
 
 } // namespace
 
+LocalProvider::LocalProvider() : settings_(std::make_shared<Settings>()) {}
+
+LocalProvider::~LocalProvider() = default;
+
+void LocalProvider::doConfigure(boost::property_tree::ptree tree)
+{
+    auto settings = std::make_shared<Settings const>(tree);
+    std::lock_guard const lock(mutex_);
+    settings_.swap(settings);
+}
+
+std::shared_ptr<Settings const> LocalProvider::settings() const
+{
+    std::lock_guard const lock(mutex_);
+    return settings_;
+}
+
+std::shared_ptr<Root const> LocalProvider::root() const
+{
+    std::shared_ptr<Settings const> settings = this->settings();
+    Root const* const root = &settings->root;
+    return {std::move(settings), root};
+}
+
 void LocalProvider::doCreateFile(StorageIRI const& iri) const
 {
+    auto const root = this->root();
     FileDescriptor file;
-    if (int const error = openFile(nativePath(iri), O_WRONLY | O_CREAT | O_EXCL, file))
+    if (int const error = root->open(root->pathOf(iri), O_WRONLY | O_CREAT | O_EXCL, file))
         throwError(error, iri);
 }
 
 void LocalProvider::doCreateFolder(StorageIRI const& iri) const
 {
-    if (int const error = makeFolder(nativePath(iri)))
+    auto const root = this->root();
+    if (int const error = makeFolder(locate(*root, root->pathOf(iri), iri).at()))
         throwError(error, iri);
 }
 
@@ -83,7 +118,8 @@ bool LocalProvider::doFolderExists(StorageIRI const& iri) const
 
 ExistenceType LocalProvider::doExists(StorageIRI const& iri) const
 {
-    std::optional<Status> const status = findStatus(nativePath(iri), Links::Follow, iri);
+    auto const root = this->root();
+    std::optional<Status> const status = findStatus(*root, root->pathOf(iri), Links::Follow, iri);
     if (!status)
         return ExistenceType::AsNeither;
     return isFolder(*status) ? ExistenceType::AsFolder : ExistenceType::AsFile;
@@ -91,12 +127,13 @@ ExistenceType LocalProvider::doExists(StorageIRI const& iri) const
 
 ExistenceTypeExtended LocalProvider::doExistsExtended(StorageIRI const& iri) const
 {
-    std::string const path = nativePath(iri);
-    std::optional<Status> const status = findStatus(path, Links::Keep, iri);
+    auto const root = this->root();
+    std::string const path = root->pathOf(iri);
+    std::optional<Status> const status = findStatus(*root, path, Links::Keep, iri);
     if (!status)
         return ExistenceTypeExtended::None;
     if (isLink(*status))
-        return typeOfLink(path, iri);
+        return typeOfLink(*root, path, iri);
     if (isFolder(*status))
         return ExistenceTypeExtended::RegularFolder;
     return S_ISREG(status->stx_mode) ? ExistenceTypeExtended::RegularFile : ExistenceTypeExtended::SpecialFile;
@@ -104,95 +141,99 @@ ExistenceTypeExtended LocalProvider::doExistsExtended(StorageIRI const& iri) con
 
 void LocalProvider::doRemoveFile(StorageIRI const& iri) const
 {
-    int const error = removeName(nativePath(iri));
+    auto const root = this->root();
+    int const error = removeName(locate(*root, root->pathOf(iri), iri).at());
     if (error != 0)
         throwError(error == EISDIR ? ENOENT : error, iri);
 }
 
 void LocalProvider::doRemoveFolder(StorageIRI const& iri) const
 {
-    std::string const path = nativePath(iri);
-    int const error = removeEmptyFolder(path);
+    auto const root = this->root();
+    std::string const path = root->pathOf(iri);
+    int const error = removeEmptyFolder(locate(*root, path, iri).at());
     if (error == ENOTDIR)
-        throwNotAFolder(path, iri);
+        throwNotAFolder(*root, path, iri);
     if (error != 0)
         throwError(error == EEXIST ? ENOTEMPTY : error, iri);
 }
 
 void LocalProvider::doMoveFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
-    detail::moveFile(from, to, policy);
+    detail::moveFile(*root(), from, to, policy);
 }
 
 void LocalProvider::doMoveFolder(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
-    detail::moveFolder(from, to, policy);
+    detail::moveFolder(*root(), from, to, policy);
 }
 
 void LocalProvider::doCopyFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
-    if (replaces(policy) && isSameContent(from, to))
+    if (replaces(policy) && isSameContent(*root(), from, to))
         return;
     IProvider::doCopyFile(from, to, policy);
 }
 
 FileAttributes LocalProvider::doGetFileAttributes(StorageIRI const& iri) const
 {
-    std::string path = nativePath(iri);
-    Status const status = requireStatus(path, iri);
+    auto root = this->root();
+    std::string path = root->pathOf(iri);
+    Status const status = requireStatus(*root, path, iri);
     if (isFolder(status))
         throwError(ErrorCode::ResourceNotFound, iri);
-    return toFileAttributes(status, std::move(path));
+    return toFileAttributes(status, std::move(root), std::move(path));
 }
 
 FolderAttributes LocalProvider::doGetFolderAttributes(StorageIRI const& iri) const
 {
-    std::string path = nativePath(iri);
-    Status const status = requireStatus(path, iri);
+    auto root = this->root();
+    std::string path = root->pathOf(iri);
+    Status const status = requireStatus(*root, path, iri);
     if (!isFolder(status))
         throwError(ErrorCode::ResourceNotFound, iri);
-    return toFolderAttributes(status, std::move(path));
+    return toFolderAttributes(status, std::move(root), std::move(path));
 }
 
 std::unique_ptr<ByteStream> LocalProvider::doOpenStream(StorageIRI const& iri,
                                                         ByteStreamOpenOptions const& options) const
 {
-    return openForWriting(iri, options);
+    return openForWriting(*root(), iri, options);
 }
 
 std::unique_ptr<ByteStream> LocalProvider::doOpenReadOnlyStream(StorageIRI const& iri) const
 {
-    return openForReading(iri);
+    return openForReading(*root(), iri);
 }
 
 IProvider::Listing LocalProvider::doListAll(StorageIRI const& folder) const
 {
-    return std::make_unique<LocalListing>(folder, Entries::All, Detail::Attributes);
+    return std::make_unique<LocalListing>(root(), folder, Entries::All, Detail::Attributes);
 }
 
 IProvider::Listing LocalProvider::doListFiles(StorageIRI const& folder) const
 {
-    return std::make_unique<LocalListing>(folder, Entries::Files, Detail::Attributes);
+    return std::make_unique<LocalListing>(root(), folder, Entries::Files, Detail::Attributes);
 }
 
 IProvider::Listing LocalProvider::doListFolders(StorageIRI const& folder) const
 {
-    return std::make_unique<LocalListing>(folder, Entries::Folders, Detail::Attributes);
+    return std::make_unique<LocalListing>(root(), folder, Entries::Folders, Detail::Attributes);
 }
 
 IProvider::Listing LocalProvider::doListAllNamesOnly(StorageIRI const& folder) const
 {
-    return std::make_unique<LocalListing>(folder, Entries::All, Detail::NamesOnly);
+    return std::make_unique<LocalListing>(root(), folder, Entries::All, Detail::NamesOnly);
 }
 
 IProvider::Listing LocalProvider::doListFilesNamesOnly(StorageIRI const& folder) const
 {
-    return std::make_unique<LocalListing>(folder, Entries::Files, Detail::NamesOnly);
+    return std::make_unique<LocalListing>(root(), folder, Entries::Files, Detail::NamesOnly);
 }
 
 IProvider::Listing LocalProvider::doListFoldersNamesOnly(StorageIRI const& folder) const
 {
-    return std::make_unique<LocalListing>(folder, Entries::Folders, Detail::NamesOnly);
+    return std::make_unique<LocalListing>(root(), folder, Entries::Folders, Detail::NamesOnly);
 }
 
 } // namespace foundation::storage::local

@@ -1,9 +1,19 @@
 #pragma once
 
 #include <foundation/export.hpp>
-#include <storage/provider/IProvider.hpp>
+#include <storage/provider/IConfigurableProvider.hpp>
+
+#include <boost/property_tree/ptree.hpp>
+
+#include <memory>
+#include <mutex>
 
 namespace foundation::storage::local {
+
+namespace detail {
+class Root;
+struct Settings;
+} // namespace detail
 
 /// The files and folders of this machine, at locations of the scheme `file`.
 ///
@@ -13,11 +23,19 @@ namespace foundation::storage::local {
 /// what is refused: see the README beside this header.
 ///
 /// Errors: `Exception`; for streams in use `ByteStreamFailure`. `InvalidLocation` where a location names no local file.
-/// Threads: any number at once. A stream or listing belongs to one thread at a time.
+/// Settings: `durability` and `root`; see the README. `configure` throws `std::invalid_argument` for what it does not
+/// understand, and changes nothing then. What is open keeps the settings that it was opened with.
+/// Threads: any number at once, with `configure` too. A stream or listing belongs to one thread at a time.
 /// Cost: holds nothing but what its streams and listings hold, a descriptor each.
-class FOUNDATION_API LocalProvider : public provider::IProvider
+class FOUNDATION_API LocalProvider : public provider::IConfigurableProvider
 {
+public:
+    LocalProvider();
+    ~LocalProvider() override;
+
 protected:
+    void doConfigure(boost::property_tree::ptree tree) override;
+
     void doCreateFile(provider::StorageIRI const& iri) const override;
     void doCreateFolder(provider::StorageIRI const& iri) const override;
     bool doFileExists(provider::StorageIRI const& iri) const override;
@@ -47,6 +65,13 @@ protected:
     Listing doListAllNamesOnly(provider::StorageIRI const& folder) const override;
     Listing doListFilesNamesOnly(provider::StorageIRI const& folder) const override;
     Listing doListFoldersNamesOnly(provider::StorageIRI const& folder) const override;
+
+private:
+    std::shared_ptr<detail::Settings const> settings() const;
+    std::shared_ptr<detail::Root const> root() const;
+
+    mutable std::mutex mutex_;
+    std::shared_ptr<detail::Settings const> settings_;
 };
 
 } // namespace foundation::storage::local

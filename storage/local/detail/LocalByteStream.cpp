@@ -3,7 +3,6 @@
 #include <storage/local/detail/SystemCalls.hpp>
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/fileSystem.hpp>
-#include <storage/local/detail/nativePath.hpp>
 
 #include <cerrno>
 #include <cstdio>
@@ -51,10 +50,10 @@ void requireRegularFile(FileDescriptor const& file, StorageIRI const& iri)
         throwError(ErrorCode::UnsupportedOperation, iri);
 }
 
-FileDescriptor openContent(std::string const& path, int flags, StorageIRI const& iri)
+FileDescriptor openContent(Root const& root, std::string const& path, int flags, StorageIRI const& iri)
 {
     FileDescriptor file;
-    if (int const error = openFile(path, flags | commonFlags, file))
+    if (int const error = root.open(path, flags | commonFlags, file))
         throwCannotOpen(error, iri);
     requireRegularFile(file, iri);
     return file;
@@ -134,18 +133,19 @@ void LocalByteStream::doClose()
         throw LocalStreamFailure("close", path_, error);
 }
 
-std::unique_ptr<ByteStream> openForReading(StorageIRI const& iri)
+std::unique_ptr<ByteStream> openForReading(Root const& root, StorageIRI const& iri)
 {
-    std::string path = nativePath(iri);
-    FileDescriptor file = openContent(path, O_RDONLY, iri);
+    std::string path = root.pathOf(iri);
+    FileDescriptor file = openContent(root, path, O_RDONLY, iri);
     systemCalls().fadvise(file.get(), 0, 0, POSIX_FADV_SEQUENTIAL);
     return std::make_unique<LocalByteStream>(std::move(file), std::move(path));
 }
 
-std::unique_ptr<ByteStream> openForWriting(StorageIRI const& iri, ByteStreamOpenOptions const& options)
+std::unique_ptr<ByteStream> openForWriting(Root const& root, StorageIRI const& iri,
+                                           ByteStreamOpenOptions const& options)
 {
-    std::string path = nativePath(iri);
-    FileDescriptor file = openContent(path, flagsOf(options), iri);
+    std::string path = root.pathOf(iri);
+    FileDescriptor file = openContent(root, path, flagsOf(options), iri);
     return std::make_unique<LocalByteStream>(std::move(file), std::move(path));
 }
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <storage/local/detail/FileDescriptor.hpp>
+#include <storage/local/detail/Root.hpp>
 #include <storage/provider/ByteStream.hpp>
 #include <storage/provider/ByteStreamFailure.hpp>
 #include <storage/provider/ByteStreamOpenOptions.hpp>
@@ -47,8 +48,8 @@ private:
 };
 
 /// Both throw `Exception`: `ResourceNotFound` for a folder, `UnsupportedOperation` for what is neither file nor folder.
-std::unique_ptr<provider::ByteStream> openForReading(provider::StorageIRI const& iri);
-std::unique_ptr<provider::ByteStream> openForWriting(provider::StorageIRI const& iri,
+std::unique_ptr<provider::ByteStream> openForReading(Root const& root, provider::StorageIRI const& iri);
+std::unique_ptr<provider::ByteStream> openForWriting(Root const& root, provider::StorageIRI const& iri,
                                                      provider::ByteStreamOpenOptions const& options);
 
 } // namespace foundation::storage::local::detail

@@ -4,13 +4,12 @@
 #include <storage/local/detail/SystemCalls.hpp>
 #include <storage/local/detail/attributes.hpp>
 #include <storage/local/detail/errorCode.hpp>
-#include <storage/local/detail/nativePath.hpp>
 
 #include <cerrno>
 #include <cstdint>
 #include <cstring>
 #include <dirent.h>
-#include <string_view>
+#include <utility>
 
 namespace foundation::storage::local::detail {
 
@@ -22,10 +21,10 @@ namespace {
 /// Hundreds of entries per call: beyond that a larger buffer gains nothing.
 constexpr std::size_t bufferSize = 32 * 1024;
 
-FileDescriptor openFolder(std::string const& path, StorageIRI const& iri)
+FileDescriptor openFolder(Root const& root, std::string const& path, StorageIRI const& iri)
 {
     FileDescriptor folder;
-    if (int const error = openFile(path, O_RDONLY | O_DIRECTORY, folder))
+    if (int const error = root.open(path, O_RDONLY | O_DIRECTORY, folder))
         throwError(error, iri);
     return folder;
 }
@@ -46,12 +45,13 @@ struct LocalListing::NameAndType
     bool isDecided() const { return type != DT_LNK && type != DT_UNKNOWN; }
 };
 
-LocalListing::LocalListing(StorageIRI const& folder, Entries entries, Detail detail)
-    : folder_(folder),
-      path_(nativePath(folder)),
+LocalListing::LocalListing(std::shared_ptr<Root const> root, StorageIRI const& folder, Entries entries, Detail detail)
+    : root_(std::move(root)),
+      folder_(folder),
+      path_(root_->pathOf(folder)),
       entries_(entries),
       detail_(detail),
-      descriptor_(openFolder(path_, folder_)),
+      descriptor_(openFolder(*root_, path_, folder_)),
       buffer_(std::make_unique_for_overwrite<char[]>(bufferSize))
 {
     next();
@@ -112,14 +112,23 @@ bool LocalListing::isFolderEntry(NameAndType const& found) const
     if (found.isDecided())
         return found.type == DT_DIR;
     Status status;
-    return getStatus(descriptor_, found.name, Links::Follow, status) == 0 && isFolder(status);
+    return getTargetStatus(found.name, status) == 0 && isFolder(status);
+}
+
+/// In a confined store a link is followed by its path, because only the root knows where it must not lead.
+int LocalListing::getTargetStatus(char const* name, Status& status) const
+{
+    if (!root_->isConfined())
+        return getStatus({descriptor_.get(), name}, Links::Follow, status);
+    int const error = getStatus({descriptor_.get(), name}, Links::Keep, status);
+    return error == 0 && isLink(status) ? root_->getStatus(path_ + '/' + name, Links::Follow, status) : error;
 }
 
 bool LocalListing::acceptAttributes(char const* name)
 {
     Status status;
-    if (getStatus(descriptor_, name, Links::Follow, status) != 0) {
-        int const error = getStatus(descriptor_, name, Links::Keep, status);
+    if (getTargetStatus(name, status) != 0) {
+        int const error = getStatus({descriptor_.get(), name}, Links::Keep, status);
         if (error == ENOENT)
             return false;
         if (error != 0)
@@ -130,9 +139,9 @@ bool LocalListing::acceptAttributes(char const* name)
         return false;
     std::string path = path_ + '/' + name;
     if (folder)
-        entry_.emplace(fl::filesystem::from_native_bytes(name), toFolderAttributes(status, std::move(path)));
+        entry_.emplace(fl::filesystem::from_native_bytes(name), toFolderAttributes(status, root_, std::move(path)));
     else
-        entry_.emplace(fl::filesystem::from_native_bytes(name), toFileAttributes(status, std::move(path)));
+        entry_.emplace(fl::filesystem::from_native_bytes(name), toFileAttributes(status, root_, std::move(path)));
     return true;
 }
 

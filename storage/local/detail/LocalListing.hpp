@@ -1,6 +1,7 @@
 #pragma once
 
 #include <storage/local/detail/FileDescriptor.hpp>
+#include <storage/local/detail/Root.hpp>
 #include <storage/provider/IFolderEntryIterator.hpp>
 #include <storage/provider/StorageIRI.hpp>
 
@@ -34,7 +35,7 @@ class LocalListing final : public provider::IFolderEntryIterator
 {
 public:
     /// Throws `Exception` when the folder cannot be opened or read.
-    LocalListing(provider::StorageIRI const& folder, Entries entries, Detail detail);
+    LocalListing(std::shared_ptr<Root const> root, provider::StorageIRI const& folder, Entries entries, Detail detail);
 
     bool hasEntry() const override { return entry_.has_value(); }
     provider::FolderEntry const& entry() const override { return *entry_; }
@@ -49,9 +50,11 @@ private:
     bool acceptName(NameAndType const& found);
     bool acceptAttributes(char const* name);
     bool isFolderEntry(NameAndType const& found) const;
+    int getTargetStatus(char const* name, Status& status) const;
     bool isWanted(bool folder) const;
     [[noreturn]] void throwAt(char const* name, int error) const;
 
+    std::shared_ptr<Root const> root_;
     provider::StorageIRI folder_;
     std::string path_;
     Entries entries_;

@@ -10,9 +10,9 @@ namespace {
 
 namespace posix_time = boost::posix_time;
 
-auto deferredWritability(std::string path)
+auto deferredWritability(std::shared_ptr<Root const> root, std::string path)
 {
-    return [path = std::move(path)] { return checkAccess(path, W_OK) == 0; };
+    return [root = std::move(root), path = std::move(path)] { return root->checkAccess(path, W_OK) == 0; };
 }
 
 } // namespace
@@ -31,14 +31,15 @@ posix_time::ptime toPtime(struct statx_timestamp const& time)
     return epoch + posix_time::seconds(time.tv_sec) + posix_time::microseconds(time.tv_nsec / 1000);
 }
 
-provider::FileAttributes toFileAttributes(Status const& status, std::string path)
+provider::FileAttributes toFileAttributes(Status const& status, std::shared_ptr<Root const> root, std::string path)
 {
-    return provider::FileAttributes(status.stx_size, toPtime(status.stx_mtime), deferredWritability(std::move(path)));
+    return provider::FileAttributes(status.stx_size, toPtime(status.stx_mtime),
+                                    deferredWritability(std::move(root), std::move(path)));
 }
 
-provider::FolderAttributes toFolderAttributes(Status const& status, std::string path)
+provider::FolderAttributes toFolderAttributes(Status const& status, std::shared_ptr<Root const> root, std::string path)
 {
-    return provider::FolderAttributes(toPtime(status.stx_mtime), deferredWritability(std::move(path)));
+    return provider::FolderAttributes(toPtime(status.stx_mtime), deferredWritability(std::move(root), std::move(path)));
 }
 
 } // namespace foundation::storage::local::detail

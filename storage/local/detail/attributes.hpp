@@ -1,12 +1,13 @@
 #pragma once
 
 #include <foundation/export.hpp>
-#include <storage/local/detail/fileSystem.hpp>
+#include <storage/local/detail/Root.hpp>
 #include <storage/provider/FileAttributes.hpp>
 #include <storage/provider/FolderAttributes.hpp>
 
 #include <boost/date_time/posix_time/posix_time_types.hpp>
 
+#include <memory>
 #include <string>
 
 namespace foundation::storage::local::detail {
@@ -15,7 +16,7 @@ namespace foundation::storage::local::detail {
 FOUNDATION_API boost::posix_time::ptime toPtime(struct statx_timestamp const& time);
 
 /// `path` is where writability is asked for, when somebody asks.
-provider::FileAttributes toFileAttributes(Status const& status, std::string path);
-provider::FolderAttributes toFolderAttributes(Status const& status, std::string path);
+provider::FileAttributes toFileAttributes(Status const& status, std::shared_ptr<Root const> root, std::string path);
+provider::FolderAttributes toFolderAttributes(Status const& status, std::shared_ptr<Root const> root, std::string path);
 
 } // namespace foundation::storage::local::detail

@@ -1,98 +1,81 @@
 #include <storage/local/detail/fileSystem.hpp>
 
-#include <cerrno>
+#include <cstdio>
+#include <fcntl.h>
+#include <unistd.h>
 
 namespace foundation::storage::local::detail {
 
 namespace {
 
-constexpr mode_t newFileMode = 0666;
-constexpr mode_t newFolderMode = 0777;
 constexpr unsigned wantedFields = STATX_TYPE | STATX_MODE | STATX_NLINK | STATX_INO | STATX_SIZE | STATX_MTIME;
 
-template <typename Call>
-int errorOf(Call const& call)
-{
-    return retried(call) == -1 ? errno : 0;
-}
-
 /// What is to be mounted on demand is not mounted for being looked at, or a listing could mount all the world.
-int askStatus(int folder, char const* path, int flags, Status& status)
+int askStatus(At const& at, int flags, Status& status)
 {
-    return errorOf([&] { return systemCalls().statx(folder, path, flags | AT_NO_AUTOMOUNT, wantedFields, &status); });
-}
-
-int flagsOf(Links links)
-{
-    return links == Links::Keep ? AT_SYMLINK_NOFOLLOW : 0;
+    return errorOf(
+        [&] { return systemCalls().statx(at.folder, at.path, flags | AT_NO_AUTOMOUNT, wantedFields, &status); });
 }
 
 } // namespace
 
-int openFile(std::string const& path, int flags, FileDescriptor& file)
+int openFile(At const& at, int flags, FileDescriptor& file, mode_t mode)
 {
-    int const descriptor =
-        retried([&] { return systemCalls().openat(AT_FDCWD, path.c_str(), flags | O_CLOEXEC, newFileMode); });
+    int const descriptor = retried([&] { return systemCalls().openat(at.folder, at.path, flags | O_CLOEXEC, mode); });
     int const error = descriptor == -1 ? errno : 0;
     file = FileDescriptor(descriptor);
     return error;
 }
 
-int getStatus(std::string const& path, Links links, Status& status)
+int getStatus(At const& at, Links links, Status& status)
 {
-    return askStatus(AT_FDCWD, path.c_str(), flagsOf(links), status);
-}
-
-int getStatus(FileDescriptor const& folder, char const* name, Links links, Status& status)
-{
-    return askStatus(folder.get(), name, flagsOf(links), status);
+    return askStatus(at, links == Links::Keep ? AT_SYMLINK_NOFOLLOW : 0, status);
 }
 
 int getStatus(FileDescriptor const& file, Status& status)
 {
-    return askStatus(file.get(), "", AT_EMPTY_PATH, status);
+    return askStatus({file.get(), ""}, AT_EMPTY_PATH, status);
 }
 
-int checkAccess(std::string const& path, int mode)
+int checkAccess(At const& at, int mode)
 {
-    return errorOf([&] { return systemCalls().faccessat(AT_FDCWD, path.c_str(), mode, AT_EACCESS); });
+    return errorOf([&] { return systemCalls().faccessat(at.folder, at.path, mode, AT_EACCESS); });
 }
 
-int makeFolder(std::string const& path)
+int checkAccess(FileDescriptor const& file, int mode)
 {
-    return errorOf([&] { return systemCalls().mkdirat(AT_FDCWD, path.c_str(), newFolderMode); });
+    return errorOf([&] { return systemCalls().faccessat(file.get(), "", mode, AT_EACCESS | AT_EMPTY_PATH); });
 }
 
-int removeName(std::string const& path)
+int makeFolder(At const& at)
 {
-    return errorOf([&] { return systemCalls().unlinkat(AT_FDCWD, path.c_str(), 0); });
+    return errorOf([&] { return systemCalls().mkdirat(at.folder, at.path, newFolderMode); });
 }
 
-int removeEmptyFolder(std::string const& path)
+int removeName(At const& at)
 {
-    return errorOf([&] { return systemCalls().unlinkat(AT_FDCWD, path.c_str(), AT_REMOVEDIR); });
+    return errorOf([&] { return systemCalls().unlinkat(at.folder, at.path, 0); });
 }
 
-int addName(std::string const& path, std::string const& secondPath)
+int removeEmptyFolder(At const& at)
 {
-    return errorOf([&] { return systemCalls().linkat(AT_FDCWD, path.c_str(), AT_FDCWD, secondPath.c_str(), 0); });
+    return errorOf([&] { return systemCalls().unlinkat(at.folder, at.path, AT_REMOVEDIR); });
 }
 
-int renameEntry(std::string const& from, std::string const& to, unsigned flags)
+int addName(At const& from, At const& to)
 {
-    return errorOf([&] { return systemCalls().renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), flags); });
+    return errorOf([&] { return systemCalls().linkat(from.folder, from.path, to.folder, to.path, 0); });
+}
+
+int renameEntry(At const& from, At const& to, unsigned flags)
+{
+    return errorOf([&] { return systemCalls().renameat2(from.folder, from.path, to.folder, to.path, flags); });
 }
 
 bool isSameFile(Status const& left, Status const& right)
 {
     return left.stx_ino == right.stx_ino && left.stx_dev_major == right.stx_dev_major &&
            left.stx_dev_minor == right.stx_dev_minor;
-}
-
-bool leadsToFolder(std::string const& path)
-{
-    Status status;
-    return getStatus(path, Links::Follow, status) == 0 && isFolder(status);
 }
 
 } // namespace foundation::storage::local::detail

@@ -3,11 +3,18 @@
 #include <storage/local/detail/FileDescriptor.hpp>
 #include <storage/local/detail/SystemCalls.hpp>
 
-#include <string>
+#include <fcntl.h>
 
 namespace foundation::storage::local::detail {
 
 // One call of the operating system each, made again when a signal interrupts it. They answer 0 or `errno`.
+
+/// A path and the open folder from which it starts. An absolute path starts from the root whatever the folder.
+struct At
+{
+    int folder = AT_FDCWD;
+    char const* path;
+};
 
 /// What the system knows of a file.
 using Status = struct statx;
@@ -18,31 +25,32 @@ enum class Links
     Keep,
 };
 
-/// New files get mode 0666, less the umask.
-[[nodiscard]] int openFile(std::string const& path, int flags, FileDescriptor& file);
+inline constexpr mode_t newFileMode = 0666;
+inline constexpr mode_t newFolderMode = 0777;
 
-[[nodiscard]] int getStatus(std::string const& path, Links links, Status& status);
+/// A new file gets `mode`, less the umask.
+[[nodiscard]] int openFile(At const& at, int flags, FileDescriptor& file, mode_t mode = newFileMode);
 
-/// Of an entry of an open folder.
-[[nodiscard]] int getStatus(FileDescriptor const& folder, char const* name, Links links, Status& status);
+[[nodiscard]] int getStatus(At const& at, Links links, Status& status);
 
 /// Of an open file.
 [[nodiscard]] int getStatus(FileDescriptor const& file, Status& status);
 
 /// Whether this user may do what `mode` (`W_OK`, `X_OK`) says.
-[[nodiscard]] int checkAccess(std::string const& path, int mode);
+[[nodiscard]] int checkAccess(At const& at, int mode);
+[[nodiscard]] int checkAccess(FileDescriptor const& file, int mode);
 
 /// The folder gets mode 0777, less the umask.
-[[nodiscard]] int makeFolder(std::string const& path);
+[[nodiscard]] int makeFolder(At const& at);
 
-int removeName(std::string const& path);
-int removeEmptyFolder(std::string const& path);
+int removeName(At const& at);
+int removeEmptyFolder(At const& at);
 
 /// Gives a file a second name; a link is not followed.
-[[nodiscard]] int addName(std::string const& path, std::string const& secondPath);
+[[nodiscard]] int addName(At const& from, At const& to);
 
 /// `flags` as for `renameat2`.
-int renameEntry(std::string const& from, std::string const& to, unsigned flags);
+int renameEntry(At const& from, At const& to, unsigned flags);
 
 inline bool isFolder(Status const& status)
 {
@@ -55,8 +63,5 @@ inline bool isLink(Status const& status)
 }
 
 bool isSameFile(Status const& left, Status const& right);
-
-/// Whether a folder stands at a path, perhaps by a link.
-bool leadsToFolder(std::string const& path);
 
 } // namespace foundation::storage::local::detail

@@ -2,7 +2,6 @@
 
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/fileSystem.hpp>
-#include <storage/local/detail/nativePath.hpp>
 
 #include <boost/uuid/random_generator.hpp>
 #include <boost/uuid/uuid_io.hpp>
@@ -22,14 +21,22 @@ namespace {
 /// Both ends of a move, as the client named them and as the system calls do.
 struct Move
 {
-    Move(StorageIRI const& source, StorageIRI const& target)
-        : from(source), to(target), fromPath(nativePath(source)), toPath(nativePath(target))
-    {}
+    Move(Root const& store, StorageIRI const& fromIRI, StorageIRI const& toIRI)
+        : root(store), from(fromIRI), to(toIRI), fromPath(root.pathOf(from)), toPath(root.pathOf(to))
+    {
+        if (int const error = root.locate(fromPath, source))
+            throwError(error, from);
+        if (int const error = root.locate(toPath, target))
+            throwError(error, to);
+    }
 
+    Root const& root;
     StorageIRI const& from;
     StorageIRI const& to;
     std::string fromPath;
     std::string toPath;
+    Located source;
+    Located target;
 };
 
 std::size_t nameStart(std::string const& path)
@@ -52,8 +59,8 @@ StorageIRI const& culprit(int error, Move const& move)
 {
     bool const forbidden = error == EACCES || error == EPERM;
     Status status;
-    bool const atSource = forbidden ? checkAccess(parentOf(move.fromPath), W_OK | X_OK) != 0
-                                    : meansMissing(getStatus(move.fromPath, Links::Keep, status));
+    bool const atSource = forbidden ? move.root.checkAccess(parentOf(move.fromPath), W_OK | X_OK) != 0
+                                    : meansMissing(getStatus(move.source.at(), Links::Keep, status));
     return atSource ? move.from : move.to;
 }
 
@@ -66,7 +73,7 @@ void requireMoved(int error, Move const& move)
 Status requireSource(Move const& move)
 {
     Status status;
-    if (int const error = getStatus(move.fromPath, Links::Keep, status))
+    if (int const error = getStatus(move.source.at(), Links::Keep, status))
         throwError(error, move.from);
     return status;
 }
@@ -77,8 +84,8 @@ bool isSameEntry(Move const& move)
     Status from;
     Status to;
     return move.fromPath.substr(nameStart(move.fromPath)) == move.toPath.substr(nameStart(move.toPath)) &&
-           getStatus(parentOf(move.fromPath), Links::Follow, from) == 0 &&
-           getStatus(parentOf(move.toPath), Links::Follow, to) == 0 && isSameFile(from, to);
+           move.root.getStatus(parentOf(move.fromPath), Links::Follow, from) == 0 &&
+           move.root.getStatus(parentOf(move.toPath), Links::Follow, to) == 0 && isSameFile(from, to);
 }
 
 bool lacksNoReplace(int error)
@@ -89,22 +96,22 @@ bool lacksNoReplace(int error)
 /// For a file system without `RENAME_NOREPLACE`: a second name is never made over an existing one either.
 int moveFileBySecondName(Move const& move)
 {
-    if (int const error = addName(move.fromPath, move.toPath))
+    if (int const error = addName(move.source.at(), move.target.at()))
         return error == EPERM ? EOPNOTSUPP : error;
-    int const error = removeName(move.fromPath);
+    int const error = removeName(move.source.at());
     if (error != 0)
-        removeName(move.toPath);
+        removeName(move.target.at());
     return error;
 }
 
 /// For a file system without `RENAME_NOREPLACE`: a folder is renamed over an empty folder only, and this one is ours.
 int moveFolderOntoNewFolder(Move const& move)
 {
-    if (int const error = makeFolder(move.toPath))
+    if (int const error = makeFolder(move.target.at()))
         return error;
-    int const error = renameEntry(move.fromPath, move.toPath, 0);
+    int const error = renameEntry(move.source.at(), move.target.at(), 0);
     if (error != 0)
-        removeEmptyFolder(move.toPath);
+        removeEmptyFolder(move.target.at());
     return error;
 }
 
@@ -114,20 +121,22 @@ int moveBetweenNames(Move const& move)
 {
     if (isSameEntry(move))
         return 0;
-    std::string const scratch = parentOf(move.toPath) + scratchName();
-    if (int const error = renameEntry(move.fromPath, scratch, RENAME_NOREPLACE))
+    Located scratch;
+    if (int const error = move.root.locate(parentOf(move.toPath) + scratchName(), scratch))
         return error;
-    int const error = renameEntry(scratch, move.toPath, 0);
+    if (int const error = renameEntry(move.source.at(), scratch.at(), RENAME_NOREPLACE))
+        return error;
+    int const error = renameEntry(scratch.at(), move.target.at(), 0);
     if (error != 0)
-        renameEntry(scratch, move.fromPath, RENAME_NOREPLACE);
+        renameEntry(scratch.at(), move.source.at(), RENAME_NOREPLACE);
     else
-        removeName(scratch);
+        removeName(scratch.at());
     return error;
 }
 
 int moveFileWithoutReplacing(Move const& move)
 {
-    int const error = renameEntry(move.fromPath, move.toPath, RENAME_NOREPLACE);
+    int const error = renameEntry(move.source.at(), move.target.at(), RENAME_NOREPLACE);
     return lacksNoReplace(error) ? moveFileBySecondName(move) : error;
 }
 
@@ -135,27 +144,28 @@ int moveFileWithoutReplacing(Move const& move)
 bool isLinkTo(Status const& target, Move const& move, Status const& source)
 {
     Status followed;
-    return isLink(source) && getStatus(move.fromPath, Links::Follow, followed) == 0 && isSameFile(followed, target);
+    return isLink(source) && move.root.getStatus(move.fromPath, Links::Follow, followed) == 0 &&
+           isSameFile(followed, target);
 }
 
 int moveFileReplacing(Move const& move, Status const& source)
 {
     Status target;
-    bool const exists = getStatus(move.toPath, Links::Keep, target) == 0;
+    bool const exists = getStatus(move.target.at(), Links::Keep, target) == 0;
     if (exists && isSameFile(source, target))
         return moveBetweenNames(move);
     if (exists && !isFolder(target) && isLinkTo(target, move, source))
-        return removeName(move.fromPath);
-    if (exists && leadsToFolder(move.toPath))
+        return removeName(move.source.at());
+    if (exists && move.root.leadsToFolder(move.toPath))
         return EEXIST;
-    int const error = renameEntry(move.fromPath, move.toPath, 0);
+    int const error = renameEntry(move.source.at(), move.target.at(), 0);
     return error == EISDIR ? EEXIST : error;
 }
 
 bool isOntoItself(Move const& move, Status const& source)
 {
     Status target;
-    return getStatus(move.toPath, Links::Follow, target) == 0 && isSameFile(source, target);
+    return move.root.getStatus(move.toPath, Links::Follow, target) == 0 && isSameFile(source, target);
 }
 
 } // namespace
@@ -165,22 +175,22 @@ bool replaces(ReplacementPolicy policy)
     return policy == ReplacementPolicy::Overwrite || policy == ReplacementPolicy::Clobber;
 }
 
-void moveFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
+void moveFile(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
 {
-    Move const move(from, to);
+    Move const move(root, from, to);
     Status const source = requireSource(move);
     if (isFolder(source))
         throwError(ErrorCode::ResourceNotFound, from);
     requireMoved(replaces(policy) ? moveFileReplacing(move, source) : moveFileWithoutReplacing(move), move);
 }
 
-void moveFolder(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
+void moveFolder(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
 {
-    Move const move(from, to);
+    Move const move(root, from, to);
     Status const source = requireSource(move);
     if (!isFolder(source))
-        throwNotAFolder(move.fromPath, from);
-    int error = renameEntry(move.fromPath, move.toPath, RENAME_NOREPLACE);
+        throwNotAFolder(root, move.fromPath, from);
+    int error = renameEntry(move.source.at(), move.target.at(), RENAME_NOREPLACE);
     if (lacksNoReplace(error))
         error = moveFolderOntoNewFolder(move);
     if (error == EEXIST && replaces(policy) && isOntoItself(move, source))
@@ -188,9 +198,9 @@ void moveFolder(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy 
     requireMoved(error, move);
 }
 
-void throwNotAFolder(std::string const& path, StorageIRI const& iri)
+void throwNotAFolder(Root const& root, std::string const& path, StorageIRI const& iri)
 {
-    throwError(leadsToFolder(path) ? ErrorCode::InvalidLocation : ErrorCode::ResourceNotFound, iri);
+    throwError(root.leadsToFolder(path) ? ErrorCode::InvalidLocation : ErrorCode::ResourceNotFound, iri);
 }
 
 } // namespace foundation::storage::local::detail

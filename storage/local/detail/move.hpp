@@ -1,5 +1,6 @@
 #pragma once
 
+#include <storage/local/detail/Root.hpp>
 #include <storage/provider/ReplacementPolicy.hpp>
 #include <storage/provider/StorageIRI.hpp>
 
@@ -7,10 +8,12 @@ namespace foundation::storage::local::detail {
 
 bool replaces(provider::ReplacementPolicy policy);
 
-void moveFile(provider::StorageIRI const& from, provider::StorageIRI const& to, provider::ReplacementPolicy policy);
-void moveFolder(provider::StorageIRI const& from, provider::StorageIRI const& to, provider::ReplacementPolicy policy);
+void moveFile(Root const& root, provider::StorageIRI const& from, provider::StorageIRI const& to,
+              provider::ReplacementPolicy policy);
+void moveFolder(Root const& root, provider::StorageIRI const& from, provider::StorageIRI const& to,
+                provider::ReplacementPolicy policy);
 
 /// Throws what is wrong with a location where a folder itself, not a link to one, had to stand.
-[[noreturn]] void throwNotAFolder(std::string const& path, provider::StorageIRI const& iri);
+[[noreturn]] void throwNotAFolder(Root const& root, std::string const& path, provider::StorageIRI const& iri);
 
 } // namespace foundation::storage::local::detail

@@ -1,0 +1,192 @@
+#include <storage/local/detail/Root.hpp>
+
+#include <storage/local/detail/errorCode.hpp>
+#include <storage/local/detail/nativePath.hpp>
+
+#include <algorithm>
+#include <climits>
+#include <stdexcept>
+#include <system_error>
+#include <utility>
+
+namespace foundation::storage::local::detail {
+
+namespace {
+
+constexpr __u64 beneath = RESOLVE_BENEATH | RESOLVE_NO_MAGICLINKS;
+
+/// How often a path is resolved anew when folders are renamed on the way. The kernel gives up rather than guess.
+constexpr int maximumRaces = 1000;
+
+int openBeneathOnce(int folder, char const* path, open_how const& how, FileDescriptor& file)
+{
+    int const descriptor = retried([&] { return systemCalls().openat2(folder, path, &how, sizeof how); });
+    int const error = descriptor == -1 ? errno : 0;
+    file = FileDescriptor(descriptor);
+    return error;
+}
+
+int openBeneath(int folder, char const* path, open_how const& how, FileDescriptor& file)
+{
+    int error = openBeneathOnce(folder, path, how, file);
+    for (int races = 0; error == EAGAIN && races < maximumRaces; ++races)
+        error = openBeneathOnce(folder, path, how, file);
+    return error;
+}
+
+/// Other file systems are entered by their mount points, not by links to them: a path that enters one is resolved again
+/// without following any link.
+int openConfined(int folder, char const* path, int flags, mode_t mode, FileDescriptor& file)
+{
+    bool const isCreating = (flags & O_CREAT) != 0 || (flags & O_TMPFILE) == O_TMPFILE;
+    open_how how{.flags = static_cast<unsigned>(flags) | O_CLOEXEC,
+                 .mode = isCreating ? mode : 0,
+                 .resolve = beneath | RESOLVE_NO_XDEV};
+    int error = openBeneath(folder, path, how, file);
+    if (error != EXDEV)
+        return error;
+    how.resolve = beneath | RESOLVE_NO_SYMLINKS;
+    error = openBeneath(folder, path, how, file);
+    return error == EXDEV || error == ELOOP ? EACCES : error;
+}
+
+std::string withoutTrailingSlashes(std::string path)
+{
+    path.resize(std::max<std::size_t>(path.find_last_not_of('/') + 1, 1));
+    return path;
+}
+
+[[noreturn]] void refuseRoot(std::string const& path, std::string const& reason)
+{
+    throw std::invalid_argument("\"" + path + "\" cannot be a root: " + reason);
+}
+
+} // namespace
+
+Root::Root(std::string const& path)
+{
+    if (!path.starts_with('/') || path.find('\0') != std::string::npos)
+        refuseRoot(path, "it is no absolute path");
+    path_ = withoutTrailingSlashes(path);
+    if (int const error = openFile({.path = path_.c_str()}, O_PATH | O_DIRECTORY, folder_))
+        refuseRoot(path, std::generic_category().message(error));
+    FileDescriptor self;
+    if (int const error = openConfined(folder_.get(), ".", O_PATH | O_DIRECTORY, 0, self))
+        refuseRoot(path, std::generic_category().message(error));
+}
+
+std::string Root::pathOf(provider::StorageIRI const& iri) const
+{
+    std::string path = nativePath(iri);
+    bool const isInside = !isConfined() || path_ == "/" ||
+                          (path.starts_with(path_) && (path.size() == path_.size() || path[path_.size()] == '/'));
+    if (!isInside)
+        throwError(provider::ErrorCode::PermissionDenied, iri);
+    return path;
+}
+
+/// Never empty, and never absolute: the kernel is given names alone.
+std::string Root::relative(std::string const& path) const
+{
+    std::size_t const start = path.find_first_not_of('/', path_.size());
+    return start == std::string::npos ? "." : path.substr(start);
+}
+
+int Root::openStep(int folder, std::string const& path, int flags, FileDescriptor& file, mode_t mode) const
+{
+    return isConfined() ? openConfined(folder, path.c_str(), flags, mode, file)
+                        : openFile({folder, path.c_str()}, flags, file, mode);
+}
+
+/// Opens folder by folder as much of a path as is too long for one call.
+int Root::descend(std::string& path, Located& entry) const
+{
+    while (path.size() >= PATH_MAX) {
+        std::size_t const end = path.rfind('/', PATH_MAX - 2);
+        if (end == std::string::npos || end == 0)
+            return ENAMETOOLONG;
+        FileDescriptor next;
+        if (int const error = openStep(entry.folder_, path.substr(0, end), O_PATH | O_DIRECTORY, next, 0))
+            return error;
+        entry.owned_ = std::move(next);
+        entry.folder_ = entry.owned_.get();
+        path.erase(0, path.find_first_not_of('/', end));
+    }
+    return 0;
+}
+
+int Root::open(std::string const& path, int flags, FileDescriptor& file, mode_t mode) const
+{
+    if (!isConfined() && path.size() < PATH_MAX)
+        return openFile({.path = path.c_str()}, flags, file, mode);
+    Located start;
+    start.folder_ = isConfined() ? folder_.get() : AT_FDCWD;
+    std::string rest = isConfined() ? relative(path) : path;
+    if (int const error = descend(rest, start))
+        return error;
+    return openStep(start.folder_, rest, flags, file, mode);
+}
+
+int Root::locate(std::string const& path, Located& entry) const
+{
+    entry = Located();
+    if (isConfined())
+        return locateConfined(relative(path), entry);
+    entry.name_ = path;
+    return descend(entry.name_, entry);
+}
+
+/// The last name goes to calls that know no confinement, so that it must not be one that leads up.
+int Root::locateConfined(std::string path, Located& entry) const
+{
+    entry.folder_ = folder_.get();
+    if (int const error = descend(path, entry))
+        return error;
+    std::size_t const slash = path.rfind('/');
+    std::string name = path.substr(slash + 1);
+    if (name == "." || name == "..")
+        name = ".";
+    else
+        path.resize(slash == std::string::npos ? 0 : slash);
+    entry.name_ = std::move(name);
+    if (path.empty())
+        return 0;
+    FileDescriptor folder;
+    if (int const error = openStep(entry.folder_, path, O_PATH | O_DIRECTORY, folder, 0))
+        return error;
+    entry.owned_ = std::move(folder);
+    entry.folder_ = entry.owned_.get();
+    return 0;
+}
+
+int Root::getStatus(std::string const& path, Links links, Status& status) const
+{
+    if (isConfined() && links == Links::Follow) {
+        FileDescriptor file;
+        int const error = open(path, O_PATH, file);
+        return error != 0 ? error : detail::getStatus(file, status);
+    }
+    Located entry;
+    int const error = locate(path, entry);
+    return error != 0 ? error : detail::getStatus(entry.at(), links, status);
+}
+
+int Root::checkAccess(std::string const& path, int mode) const
+{
+    if (isConfined()) {
+        FileDescriptor file;
+        int const error = open(path, O_PATH, file);
+        return error != 0 ? error : detail::checkAccess(file, mode);
+    }
+    Located entry;
+    int const error = locate(path, entry);
+    return error != 0 ? error : detail::checkAccess(entry.at(), mode);
+}
+
+bool Root::leadsToFolder(std::string const& path) const
+{
+    Status status;
+    return getStatus(path, Links::Follow, status) == 0 && isFolder(status);
+}
+
+} // namespace foundation::storage::local::detail

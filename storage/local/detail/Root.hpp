@@ -1,0 +1,79 @@
+#pragma once
+
+#include <foundation/export.hpp>
+#include <storage/local/detail/FileDescriptor.hpp>
+#include <storage/local/detail/fileSystem.hpp>
+#include <storage/provider/StorageIRI.hpp>
+
+#include <string>
+#include <string_view>
+
+namespace foundation::storage::local::detail {
+
+/// An entry by its name in an open folder. For calls that do not follow a link at the end of a path.
+///
+/// Refers to the root that located it, which must outlive it.
+class FOUNDATION_API Located
+{
+public:
+    At at() const { return {folder_, name_.c_str()}; }
+
+private:
+    friend class Root;
+
+    FileDescriptor owned_;
+    int folder_ = AT_FDCWD;
+    std::string name_;
+};
+
+/// The part of the file system that a provider may touch: all of it, or what lies beneath one folder.
+///
+/// Confined to a folder, each path is resolved by the kernel in one step that never leaves the folder, whatever is
+/// renamed or swapped meanwhile (`openat2` with `RESOLVE_BENEATH` and `RESOLVE_NO_MAGICLINKS`). A link that is
+/// absolute, leads above the folder, or is on the way to another mounted file system answers `EACCES`. All calls on a
+/// path take the one that `pathOf` gave; how long it is does not matter.
+///
+/// Threads: any number at once.
+/// Cost: the same number of calls as without a root where a file is opened; one more, to open the folder or the file,
+/// for all else. None more for what is not confined.
+class FOUNDATION_API Root
+{
+public:
+    /// All of the file system.
+    Root() = default;
+
+    /// What lies beneath a folder, and the folder. Throws `std::invalid_argument` naming the path, and why it cannot be
+    /// a root: it is not absolute, leads to no folder, or the system has no `openat2` (Linux 5.6).
+    explicit Root(std::string const& path);
+
+    bool isConfined() const { return folder_.isOpen(); }
+
+    /// The absolute path of a location, as from `nativePath`; throws what that throws, and `Exception` with
+    /// `PermissionDenied` for one that does not lie beneath the folder.
+    std::string pathOf(provider::StorageIRI const& iri) const;
+
+    /// Opens what a path leads to. A new file gets `mode`, less the umask.
+    [[nodiscard]] int open(std::string const& path, int flags, FileDescriptor& file, mode_t mode = newFileMode) const;
+
+    [[nodiscard]] int getStatus(std::string const& path, Links links, Status& status) const;
+
+    /// Whether this user may do what `mode` (`W_OK`, `X_OK`) says.
+    [[nodiscard]] int checkAccess(std::string const& path, int mode) const;
+
+    /// Finds the folder that holds the last name of a path.
+    [[nodiscard]] int locate(std::string const& path, Located& entry) const;
+
+    /// Whether a folder stands at a path, perhaps by a link.
+    bool leadsToFolder(std::string const& path) const;
+
+private:
+    std::string relative(std::string const& path) const;
+    int openStep(int folder, std::string const& path, int flags, FileDescriptor& file, mode_t mode) const;
+    int descend(std::string& path, Located& entry) const;
+    int locateConfined(std::string path, Located& entry) const;
+
+    std::string path_;
+    FileDescriptor folder_;
+};
+
+} // namespace foundation::storage::local::detail
