@@ -7,19 +7,6 @@
 
 namespace foundation::storage::local::detail {
 
-FileDescriptor::FileDescriptor(FileDescriptor&& other) noexcept : descriptor_(std::exchange(other.descriptor_, -1)) {}
-
-FileDescriptor& FileDescriptor::operator=(FileDescriptor&& other) noexcept
-{
-    std::swap(descriptor_, other.descriptor_);
-    return *this;
-}
-
-FileDescriptor::~FileDescriptor()
-{
-    static_cast<void>(close());
-}
-
 int FileDescriptor::close() noexcept
 {
     if (!isOpen())

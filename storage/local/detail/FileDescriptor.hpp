@@ -2,6 +2,8 @@
 
 #include <foundation/export.hpp>
 
+#include <utility>
+
 namespace foundation::storage::local::detail {
 
 /// Owns an open file descriptor, or none.
@@ -10,9 +12,17 @@ class FOUNDATION_API FileDescriptor
 public:
     FileDescriptor() = default;
     explicit FileDescriptor(int descriptor) noexcept : descriptor_(descriptor) {}
-    FileDescriptor(FileDescriptor&& other) noexcept;
-    FileDescriptor& operator=(FileDescriptor&& other) noexcept;
-    ~FileDescriptor();
+    FileDescriptor(FileDescriptor&& other) noexcept : descriptor_(std::exchange(other.descriptor_, -1)) {}
+    FileDescriptor& operator=(FileDescriptor&& other) noexcept
+    {
+        std::swap(descriptor_, other.descriptor_);
+        return *this;
+    }
+    ~FileDescriptor()
+    {
+        if (isOpen())
+            static_cast<void>(close());
+    }
 
     bool isOpen() const noexcept { return descriptor_ >= 0; }
     int get() const noexcept { return descriptor_; }

@@ -18,19 +18,14 @@ constexpr __u64 beneath = RESOLVE_BENEATH | RESOLVE_NO_MAGICLINKS;
 /// How often a path is resolved anew when folders are renamed on the way. The kernel gives up rather than guess.
 constexpr int maximumRaces = 1000;
 
-int openBeneathOnce(int folder, char const* path, open_how const& how, FileDescriptor& file)
-{
-    int const descriptor = retried([&] { return systemCalls().openat2(folder, path, &how, sizeof how); });
-    int const error = descriptor == -1 ? errno : 0;
-    file = FileDescriptor(descriptor);
-    return error;
-}
-
 int openBeneath(int folder, char const* path, open_how const& how, FileDescriptor& file)
 {
-    int error = openBeneathOnce(folder, path, how, file);
-    for (int races = 0; error == EAGAIN && races < maximumRaces; ++races)
-        error = openBeneathOnce(folder, path, how, file);
+    auto const open = [&] { return systemCalls().openat2(folder, path, &how, sizeof how); };
+    int descriptor = retried(open);
+    for (int races = 0; descriptor == -1 && errno == EAGAIN && races < maximumRaces; ++races)
+        descriptor = retried(open);
+    int const error = descriptor == -1 ? errno : 0;
+    file = FileDescriptor(descriptor);
     return error;
 }
 
@@ -86,16 +81,15 @@ std::string Root::pathOf(provider::StorageIRI const& iri) const
 }
 
 /// Never empty, and never absolute: the kernel is given names alone.
-std::string Root::relative(std::string const& path) const
+char const* Root::relative(std::string const& path) const
 {
     std::size_t const start = path.find_first_not_of('/', path_.size());
-    return start == std::string::npos ? "." : path.substr(start);
+    return start == std::string::npos ? "." : path.c_str() + start;
 }
 
-int Root::openStep(int folder, std::string const& path, int flags, FileDescriptor& file, mode_t mode) const
+int Root::openStep(int folder, char const* path, int flags, FileDescriptor& file, mode_t mode) const
 {
-    return isConfined() ? openConfined(folder, path.c_str(), flags, mode, file)
-                        : openFile({folder, path.c_str()}, flags, file, mode);
+    return isConfined() ? openConfined(folder, path, flags, mode, file) : openFile({folder, path}, flags, file, mode);
 }
 
 /// Opens folder by folder as much of a path as is too long for one call.
@@ -106,7 +100,7 @@ int Root::descend(std::string& path, Located& entry) const
         if (end == std::string::npos || end == 0)
             return ENAMETOOLONG;
         FileDescriptor next;
-        if (int const error = openStep(entry.folder_, path.substr(0, end), O_PATH | O_DIRECTORY, next, 0))
+        if (int const error = openStep(entry.folder_, path.substr(0, end).c_str(), O_PATH | O_DIRECTORY, next, 0))
             return error;
         entry.owned_ = std::move(next);
         entry.folder_ = entry.owned_.get();
@@ -117,14 +111,16 @@ int Root::descend(std::string& path, Located& entry) const
 
 int Root::open(std::string const& path, int flags, FileDescriptor& file, mode_t mode) const
 {
-    if (!isConfined() && path.size() < PATH_MAX)
-        return openFile({.path = path.c_str()}, flags, file, mode);
+    int const folder = isConfined() ? folder_.get() : AT_FDCWD;
+    char const* const name = isConfined() ? relative(path) : path.c_str();
+    if (path.size() < PATH_MAX)
+        return openStep(folder, name, flags, file, mode);
     Located start;
-    start.folder_ = isConfined() ? folder_.get() : AT_FDCWD;
-    std::string rest = isConfined() ? relative(path) : path;
+    start.folder_ = folder;
+    std::string rest = name;
     if (int const error = descend(rest, start))
         return error;
-    return openStep(start.folder_, rest, flags, file, mode);
+    return openStep(start.folder_, rest.c_str(), flags, file, mode);
 }
 
 int Root::locate(std::string const& path, Located& entry) const
@@ -152,7 +148,7 @@ int Root::locateConfined(std::string path, Located& entry) const
     if (path.empty())
         return 0;
     FileDescriptor folder;
-    if (int const error = openStep(entry.folder_, path, O_PATH | O_DIRECTORY, folder, 0))
+    if (int const error = openStep(entry.folder_, path.c_str(), O_PATH | O_DIRECTORY, folder, 0))
         return error;
     entry.owned_ = std::move(folder);
     entry.folder_ = entry.owned_.get();

@@ -67,8 +67,8 @@ public:
     bool leadsToFolder(std::string const& path) const;
 
 private:
-    std::string relative(std::string const& path) const;
-    int openStep(int folder, std::string const& path, int flags, FileDescriptor& file, mode_t mode) const;
+    char const* relative(std::string const& path) const;
+    int openStep(int folder, char const* path, int flags, FileDescriptor& file, mode_t mode) const;
     int descend(std::string& path, Located& entry) const;
     int locateConfined(std::string path, Located& entry) const;
 
