@@ -12,6 +12,7 @@
 
 namespace foundation::storage::memory {
 
+using fl::filesystem::Wildcards;
 using namespace provider;
 using detail::Depth;
 using detail::Detail;
@@ -207,7 +208,7 @@ IProvider::Listing MemoryProvider::doListAll(StorageIRI const& folder) const
 
 IProvider::Listing MemoryProvider::doListAllWildcards(StorageIRI const& folder, std::u16string pattern) const
 {
-    return list(folder, {.pattern = std::move(pattern)});
+    return list(folder, {.pattern = Wildcards(pattern)});
 }
 
 IProvider::Listing MemoryProvider::doListFiles(StorageIRI const& folder) const
@@ -217,7 +218,7 @@ IProvider::Listing MemoryProvider::doListFiles(StorageIRI const& folder) const
 
 IProvider::Listing MemoryProvider::doListFilesWildcards(StorageIRI const& folder, std::u16string pattern) const
 {
-    return list(folder, {.entries = Entries::Files, .pattern = std::move(pattern)});
+    return list(folder, {.entries = Entries::Files, .pattern = Wildcards(pattern)});
 }
 
 IProvider::Listing MemoryProvider::doListFolders(StorageIRI const& folder) const
@@ -227,7 +228,7 @@ IProvider::Listing MemoryProvider::doListFolders(StorageIRI const& folder) const
 
 IProvider::Listing MemoryProvider::doListFoldersWildcards(StorageIRI const& folder, std::u16string pattern) const
 {
-    return list(folder, {.entries = Entries::Folders, .pattern = std::move(pattern)});
+    return list(folder, {.entries = Entries::Folders, .pattern = Wildcards(pattern)});
 }
 
 IProvider::Listing MemoryProvider::doListAllNamesOnly(StorageIRI const& folder) const
@@ -237,7 +238,7 @@ IProvider::Listing MemoryProvider::doListAllNamesOnly(StorageIRI const& folder) 
 
 IProvider::Listing MemoryProvider::doListAllNamesOnlyWildcards(StorageIRI const& folder, std::u16string pattern) const
 {
-    return list(folder, {.detail = Detail::NamesOnly, .pattern = std::move(pattern)});
+    return list(folder, {.detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
 }
 
 IProvider::Listing MemoryProvider::doListFoldersNamesOnly(StorageIRI const& folder) const
@@ -248,7 +249,7 @@ IProvider::Listing MemoryProvider::doListFoldersNamesOnly(StorageIRI const& fold
 IProvider::Listing MemoryProvider::doListFoldersNamesOnlyWildcards(StorageIRI const& folder,
                                                                    std::u16string pattern) const
 {
-    return list(folder, {.entries = Entries::Folders, .detail = Detail::NamesOnly, .pattern = std::move(pattern)});
+    return list(folder, {.entries = Entries::Folders, .detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
 }
 
 IProvider::Listing MemoryProvider::doListFilesNamesOnly(StorageIRI const& folder) const
@@ -258,7 +259,7 @@ IProvider::Listing MemoryProvider::doListFilesNamesOnly(StorageIRI const& folder
 
 IProvider::Listing MemoryProvider::doListFilesNamesOnlyWildcards(StorageIRI const& folder, std::u16string pattern) const
 {
-    return list(folder, {.entries = Entries::Files, .detail = Detail::NamesOnly, .pattern = std::move(pattern)});
+    return list(folder, {.entries = Entries::Files, .detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
 }
 
 IProvider::Listing MemoryProvider::doListAllRecursive(StorageIRI const& folder) const
@@ -268,7 +269,7 @@ IProvider::Listing MemoryProvider::doListAllRecursive(StorageIRI const& folder) 
 
 IProvider::Listing MemoryProvider::doListAllRecursiveWildcards(StorageIRI const& folder, std::u16string pattern) const
 {
-    return list(folder, {.depth = Depth::AllBelow, .pattern = std::move(pattern)});
+    return list(folder, {.depth = Depth::AllBelow, .pattern = Wildcards(pattern)});
 }
 
 IProvider::Listing MemoryProvider::doListAllRecursiveNamesOnly(StorageIRI const& folder) const
@@ -279,7 +280,7 @@ IProvider::Listing MemoryProvider::doListAllRecursiveNamesOnly(StorageIRI const&
 IProvider::Listing MemoryProvider::doListAllRecursiveNamesOnlyWildcards(StorageIRI const& folder,
                                                                         std::u16string pattern) const
 {
-    return list(folder, {.detail = Detail::NamesOnly, .depth = Depth::AllBelow, .pattern = std::move(pattern)});
+    return list(folder, {.detail = Detail::NamesOnly, .depth = Depth::AllBelow, .pattern = Wildcards(pattern)});
 }
 
 } // namespace foundation::storage::memory

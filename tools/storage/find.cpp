@@ -10,7 +10,6 @@
 #include <boost/date_time/microsec_time_clock.hpp>
 #include <fl/filesystem/native_name.hpp>
 #include <fl/filesystem/wildcards.hpp>
-#include <fl/i18n/case.hpp>
 #include <memory>
 #include <stdexcept>
 
@@ -19,30 +18,13 @@ namespace foundation::storage::tool {
 namespace {
 
 using boost::posix_time::ptime;
-
-/// In lower case; what stands outside the basic plane comes as it is.
-std::u16string lowered(std::u16string text)
-{
-    for (char16_t& unit : text)
-        unit = static_cast<char16_t>(fl::i18n::to_lower(unit));
-    return text;
-}
-
-struct NamePattern
-{
-    std::u16string pattern;
-    bool ignoresCase;
-
-    bool matches(std::u16string const& name) const
-    {
-        return fl::filesystem::matches_wildcards(ignoresCase ? lowered(name) : name, pattern);
-    }
-};
+using fl::filesystem::LetterCase;
+using fl::filesystem::Wildcards;
 
 struct Options
 {
     std::vector<std::string> paths{"."};
-    std::vector<NamePattern> names;
+    std::vector<Wildcards> names;
     std::vector<std::string> types;
     std::vector<SizeTest> sizes;
     std::optional<ptime> newer;
@@ -64,7 +46,7 @@ bool isOfType(Kind kind, std::string const& type)
 
 bool fitsName(Options const& options, std::u16string const& name)
 {
-    auto const matches = [&](NamePattern const& pattern) { return pattern.matches(name); };
+    auto const matches = [&](Wildcards const& pattern) { return pattern.matches(name); };
     return options.names.empty() || std::any_of(options.names.begin(), options.names.end(), matches);
 }
 
@@ -132,20 +114,19 @@ private:
     Options const& options_;
 };
 
-NamePattern makePattern(std::string const& text, bool ignoresCase)
+Wildcards makePattern(std::string const& text, LetterCase letterCase)
 {
     if (text.find('/') != std::string::npos)
         throw std::invalid_argument('\'' + text + "' has a '/', which no name has");
-    std::u16string pattern = fl::filesystem::from_native_bytes(text);
-    return {ignoresCase ? lowered(std::move(pattern)) : std::move(pattern), ignoresCase};
+    return Wildcards(fl::filesystem::from_native_bytes(text), letterCase);
 }
 
 void addPatterns(CLI::App& app, Options& options)
 {
     addValues(app, "-n,--name", "PATTERN", "Only what has such a name; * ? and [a-z] are those of the shell",
-              [&](std::string const& text) { options.names.push_back(makePattern(text, false)); });
+              [&](std::string const& text) { options.names.push_back(makePattern(text, LetterCase::Matters)); });
     addValues(app, "-i,--iname", "PATTERN", "The same, in upper or lower case",
-              [&](std::string const& text) { options.names.push_back(makePattern(text, true)); });
+              [&](std::string const& text) { options.names.push_back(makePattern(text, LetterCase::Ignored)); });
 }
 
 void addTimes(CLI::App& app, Options& options)

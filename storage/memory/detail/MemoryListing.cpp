@@ -1,7 +1,5 @@
 #include <storage/memory/detail/MemoryListing.hpp>
 
-#include <fl/filesystem/wildcards.hpp>
-
 #include <utility>
 
 namespace foundation::storage::memory::detail {
@@ -69,7 +67,7 @@ bool MemoryListing::isWanted(FoundEntry const& found) const
 {
     if (selection_.entries != Entries::All && (selection_.entries == Entries::Files) != isFile(found))
         return false;
-    return selection_.pattern.empty() || fl::filesystem::matches_wildcards(found.name, selection_.pattern);
+    return !selection_.pattern || selection_.pattern->matches(found.name);
 }
 
 FolderEntry MemoryListing::makeEntry(std::u16string name, FoundEntry const& found) const

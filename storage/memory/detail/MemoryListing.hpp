@@ -1,5 +1,6 @@
 #pragma once
 
+#include <fl/filesystem/wildcards.hpp>
 #include <foundation/export.hpp>
 #include <storage/memory/detail/Tree.hpp>
 #include <storage/provider/IFolderEntryIterator.hpp>
@@ -31,13 +32,13 @@ enum class Depth
     AllBelow,
 };
 
-/// What a listing gives: an entry of the wanted kind whose own name matches the pattern, unless that is empty.
+/// What a listing gives: an entry of the wanted kind whose own name matches the pattern, where there is one.
 struct Selection
 {
     Entries entries = Entries::All;
     Detail detail = Detail::Attributes;
     Depth depth = Depth::OneFolder;
-    std::u16string pattern = {};
+    std::optional<fl::filesystem::Wildcards> pattern = {};
 };
 
 /// A folder, walked by name while others may change it.
