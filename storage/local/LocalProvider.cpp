@@ -5,7 +5,9 @@
 #include <storage/local/detail/Root.hpp>
 #include <storage/local/detail/Settings.hpp>
 #include <storage/local/detail/attributes.hpp>
+#include <storage/local/detail/changeAttributes.hpp>
 #include <storage/local/detail/errorCode.hpp>
+#include <storage/local/detail/extendedAttributes.hpp>
 #include <storage/local/detail/fileSystem.hpp>
 #include <storage/local/detail/move.hpp>
 
@@ -193,6 +195,21 @@ FolderAttributes LocalProvider::doGetFolderAttributes(StorageIRI const& iri) con
     if (!isFolder(status))
         throwError(ErrorCode::ResourceNotFound, iri);
     return toFolderAttributes(status, std::move(root), std::move(path));
+}
+
+ExtendedAttributes LocalProvider::doGetExtendedAttributes(StorageIRI const& iri) const
+{
+    return detail::getExtendedAttributes(*root(), iri);
+}
+
+void LocalProvider::doSetLastModified(StorageIRI const& iri, boost::posix_time::ptime const& time) const
+{
+    detail::setLastModified(*root(), iri, time);
+}
+
+void LocalProvider::doSetWritable(StorageIRI const& iri, bool writable) const
+{
+    detail::setWritable(*root(), iri, writable);
 }
 
 std::unique_ptr<ByteStream> LocalProvider::doOpenStream(StorageIRI const& iri,

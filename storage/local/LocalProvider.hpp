@@ -19,8 +19,8 @@ struct Settings;
 ///
 /// A path has the meaning that the operating system gives it: links are followed on the way, "." and ".." are names
 /// that it resolves. Names are the bytes on disk in UTF-16; a byte that takes no part in UTF-8 has a stand-in (see
-/// `fl::filesystem::from_native_bytes`), so that every file can be listed and reached. Links, special files, moves and
-/// what is refused: see the README beside this header.
+/// `fl::filesystem::from_native_bytes`), so that every file can be listed and reached. Links, special files, moves,
+/// extended attributes and what is refused: see the README beside this header.
 ///
 /// Errors: `Exception`; for streams in use `ByteStreamFailure`. `InvalidLocation` where a location names no local file.
 /// Settings: `durability` and `root`; see the README. `configure` throws `std::invalid_argument` for what it does not
@@ -54,6 +54,9 @@ protected:
 
     provider::FileAttributes doGetFileAttributes(provider::StorageIRI const& iri) const override;
     provider::FolderAttributes doGetFolderAttributes(provider::StorageIRI const& iri) const override;
+    provider::ExtendedAttributes doGetExtendedAttributes(provider::StorageIRI const& iri) const override;
+    void doSetLastModified(provider::StorageIRI const& iri, boost::posix_time::ptime const& time) const override;
+    void doSetWritable(provider::StorageIRI const& iri, bool writable) const override;
 
     std::unique_ptr<provider::ByteStream> doOpenStream(provider::StorageIRI const& iri,
                                                        provider::ByteStreamOpenOptions const& options) const override;

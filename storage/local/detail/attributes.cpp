@@ -31,6 +31,15 @@ posix_time::ptime toPtime(struct statx_timestamp const& time)
     return epoch + posix_time::seconds(time.tv_sec) + posix_time::microseconds(time.tv_nsec / 1000);
 }
 
+timespec toTimespec(posix_time::ptime const& time)
+{
+    static posix_time::ptime const epoch(boost::gregorian::date(1970, 1, 1));
+    constexpr std::int64_t second = 1'000'000;
+    std::int64_t const microseconds = (time - epoch).total_microseconds();
+    std::int64_t const fraction = (microseconds % second + second) % second; // also of times before 1970
+    return {.tv_sec = (microseconds - fraction) / second, .tv_nsec = fraction * 1000};
+}
+
 provider::FileAttributes toFileAttributes(Status const& status, std::shared_ptr<Root const> root, std::string path)
 {
     return provider::FileAttributes(status.stx_size, toPtime(status.stx_mtime),

@@ -7,6 +7,7 @@
 
 #include <boost/date_time/posix_time/posix_time_types.hpp>
 
+#include <ctime>
 #include <memory>
 #include <string>
 
@@ -14,6 +15,9 @@ namespace foundation::storage::local::detail {
 
 /// A point in time with microseconds, rounded down; one that the result cannot hold becomes the nearest that it can.
 FOUNDATION_API boost::posix_time::ptime toPtime(struct statx_timestamp const& time);
+
+/// The other way round, for any time that is not special.
+FOUNDATION_API timespec toTimespec(boost::posix_time::ptime const& time);
 
 /// `path` is where writability is asked for, when somebody asks.
 provider::FileAttributes toFileAttributes(Status const& status, std::shared_ptr<Root const> root, std::string path);

@@ -56,6 +56,7 @@ ErrorCode toErrorCode(int error)
     case EFAULT:
         return ErrorCode::InternalError;
     case ENOSYS:
+    case E2BIG:
     case EOPNOTSUPP:
     case EXDEV:
         return ErrorCode::UnsupportedOperation;

@@ -3,6 +3,7 @@
 #include <storage/local/detail/FileDescriptor.hpp>
 #include <storage/local/detail/SystemCalls.hpp>
 
+#include <cstddef>
 #include <fcntl.h>
 
 namespace foundation::storage::local::detail {
@@ -36,9 +37,26 @@ inline constexpr mode_t newFolderMode = 0777;
 /// Of an open file.
 [[nodiscard]] int getStatus(FileDescriptor const& file, Status& status);
 
+/// The same, with all that `statx` can tell.
+[[nodiscard]] int getFullStatus(FileDescriptor const& file, Status& status);
+
 /// Whether this user may do what `mode` (`W_OK`, `X_OK`) says.
 [[nodiscard]] int checkAccess(At const& at, int mode);
 [[nodiscard]] int checkAccess(FileDescriptor const& file, int mode);
+
+// Also of a file that was opened with `O_PATH`, by its path below /proc where no call takes such a descriptor;
+// `EOPNOTSUPP` where /proc is not mounted.
+
+[[nodiscard]] int setMode(FileDescriptor const& file, mode_t mode);
+
+/// Leaves the time of the last access as it is.
+[[nodiscard]] int setModified(FileDescriptor const& file, timespec const& time);
+
+inline constexpr std::size_t maximumAttributeSize = 64 * 1024; // no system holds longer lists, nor values
+
+/// Names, each ended by NUL. The buffer has to have room for the maximum, so that nothing can grow beyond it meanwhile.
+[[nodiscard]] int listAttributes(FileDescriptor const& file, char* names, std::size_t& size);
+[[nodiscard]] int getAttribute(FileDescriptor const& file, char const* name, char* value, std::size_t& size);
 
 /// The folder gets mode 0777, less the umask.
 [[nodiscard]] int makeFolder(At const& at);

@@ -4,8 +4,12 @@
 #include <storage/local/LocalProvider.hpp>
 #include <tests/support/TemporaryFolder.hpp>
 
+#include <fcntl.h>
 #include <filesystem>
+#include <set>
+#include <string>
 #include <sys/stat.h>
+#include <unistd.h>
 
 namespace foundation::storage::conformance {
 
@@ -22,13 +26,31 @@ Place makePlace()
     return {std::make_shared<local::LocalProvider>(), folder->iri(), folder};
 }
 
+std::set<std::string> attributesOfEveryFile()
+{
+    std::set<std::string> names{"mode",   "uid",       "gid",        "links",     "inode",
+                                "device", "allocated", "accessTime", "changeTime"};
+    struct statx status
+    {};
+    std::string const folder = std::filesystem::temp_directory_path();
+    if (::statx(AT_FDCWD, folder.c_str(), 0, STATX_BTIME, &status) == 0 && (status.stx_mask & STATX_BTIME) != 0)
+        names.insert("birthTime");
+    return names;
+}
+
 } // namespace
 
 Harness localHarness()
 {
+    bool const permissionsBind = ::geteuid() != 0;
     return {
         .makePlace = makePlace,
-        .capabilities = {.copyOntoItself = CopyOntoItself::ChangesNothing, .longestName = 255},
+        .capabilities = {.copyOntoItself = CopyOntoItself::ChangesNothing,
+                         .settableTimes = boost::posix_time::microseconds(1),
+                         .settableWritability = true,
+                         .enforcedWritability = permissionsBind,
+                         .extendedAttributes = attributesOfEveryFile(),
+                         .longestName = 255},
         .makers = {
             .symbolicLink = [](auto& link,
                                auto& target) { std::filesystem::create_symlink(native(target), native(link)); },

@@ -354,8 +354,6 @@ TEST_F(LocalProviderTest, RefusesWhatItCannotDo)
     auto const refused = failure(ErrorCode::UnsupportedOperation, at(u"folder"));
     EXPECT_EQ(failureOf([&] { provider.removeFolderRecursively(at(u"folder")); }), refused);
     EXPECT_EQ(failureOf([&] { provider.listAllRecursive(at(u"folder")); }), refused);
-    EXPECT_EQ(failureOf([&] { provider.setWritable(at(u"folder"), false); }), refused);
-    EXPECT_EQ(failureOf([&] { provider.setLastModified(at(u"folder"), {}); }), refused);
     EXPECT_EQ(failureOf([&] { provider.copyFileAtomic(at(u"file"), at(u"new"), ReplacementPolicy::Preserve, {}); }),
               failure(ErrorCode::UnsupportedOperation, at(u"file")));
     EXPECT_THROW(provider.publishFolderEventsFor(at(u"folder"), {}, {}), ChangeEventsNotSupportedException);

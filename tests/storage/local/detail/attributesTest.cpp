@@ -60,5 +60,20 @@ TEST(ToPtime, OfATimeBeyondTheCalendarIsItsEnd)
     }
 }
 
+TEST(ToTimespec, IsTheOtherWayRound)
+{
+    for (std::int64_t const seconds :
+         std::vector<std::int64_t>{-17'987'443'200, -2'147'483'649, -1, 0, 1, 253'402'300'799})
+        for (std::uint32_t const nanoseconds : {0u, 1000u, 999'999'000u}) {
+            struct statx_timestamp time
+            {};
+            time.tv_sec = seconds;
+            time.tv_nsec = nanoseconds;
+            timespec const back = toTimespec(toPtime(time));
+            EXPECT_EQ(back.tv_sec, seconds) << nanoseconds;
+            EXPECT_EQ(back.tv_nsec, nanoseconds) << seconds;
+        }
+}
+
 } // namespace
 } // namespace foundation::storage::local::detail

@@ -44,6 +44,7 @@ std::map<int, ErrorCode> const known{
     {ENODEV, ErrorCode::IOError},
     {EBADF, ErrorCode::InternalError},
     {EFAULT, ErrorCode::InternalError},
+    {E2BIG, ErrorCode::UnsupportedOperation},
     {ENOSYS, ErrorCode::UnsupportedOperation},
     {EOPNOTSUPP, ErrorCode::UnsupportedOperation},
     {EXDEV, ErrorCode::UnsupportedOperation},
