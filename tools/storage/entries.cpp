@@ -1,5 +1,6 @@
 #include <tools/storage/entries.hpp>
 
+#include <fl/filesystem/native_name.hpp>
 #include <fl/i18n/utf8.hpp>
 #include <nlohmann/json.hpp>
 #include <tools/storage/describe.hpp>
@@ -14,11 +15,25 @@ std::string toUtf8(std::u16string const& text)
     return fl::i18n::to_utf8(text, fl::i18n::Malformed::Replace);
 }
 
+/// A JSON text holds no bytes: those outside UTF-8 become what they are in names.
+nlohmann::ordered_json toJSON(std::vector<Attribute> const& attributes)
+{
+    nlohmann::ordered_json object;
+    for (auto const& [name, value] : attributes) {
+        auto& member = object[toUtf8(fl::filesystem::from_native_bytes(name))];
+        if (auto const* const number = std::get_if<std::uint64_t>(&value))
+            member = *number;
+        else
+            member = toUtf8(fl::filesystem::from_native_bytes(std::get<std::string>(value)));
+    }
+    return object;
+}
+
 } // namespace
 
 Entry bareEntry(Place const& place, Kind kind)
 {
-    return {place.item().getName(), place.item().getLocation(), kind, {}, {}, {}, {}, {}};
+    return {place.item().getName(), place.item().getLocation(), kind, {}, {}, {}, {}, {}, {}};
 }
 
 Entry describeEntry(Place const& place)
@@ -36,6 +51,14 @@ Entry describeEntry(Place const& place)
             entry.isWritable = attributes.isWritable();
         }
     });
+    return entry;
+}
+
+Entry describeFully(Place const& place)
+{
+    Entry entry = describeEntry(place);
+    if (entry.kind != Kind::BrokenSymlink)
+        entry.attributes = toldAttributes(at(place, [&] { return place.item().getExtendedAttributes(); }));
     return entry;
 }
 
@@ -76,6 +99,8 @@ std::string toJSON(Entry const& entry)
         object["modified"] = formatTime(*entry.modified, Precision::Microseconds);
     if (entry.isWritable)
         object["writable"] = *entry.isWritable;
+    if (!entry.attributes.empty())
+        object["attributes"] = toJSON(entry.attributes);
     constexpr int onOneLine = -1;
     constexpr bool inASCII = true;
     return object.dump(onOneLine, ' ', inASCII);

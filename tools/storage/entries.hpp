@@ -3,11 +3,13 @@
 #include <boost/date_time/posix_time/posix_time_types.hpp>
 #include <tools/storage/FolderStack.hpp>
 #include <tools/storage/Place.hpp>
+#include <tools/storage/attributes.hpp>
 #include <tools/storage/kinds.hpp>
 
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <vector>
 
 namespace foundation::storage::tool {
 
@@ -22,6 +24,7 @@ struct Entry
     std::optional<bool> isWritable;
     std::optional<std::uint64_t> depth; ///< how many folders below the argument
     std::optional<std::uint64_t> files; ///< how many files lie below
+    std::vector<Attribute> attributes;  ///< those that only some stores have
 };
 
 /// One of which nothing is known but what it is.
@@ -29,6 +32,9 @@ Entry bareEntry(Place const& place, Kind kind);
 
 /// All of it, asked from the store; failures name the place, be it that nothing is there.
 Entry describeEntry(Place const& place);
+
+/// The same, and the extended attributes.
+Entry describeFully(Place const& place);
 
 /// What a listing said of a place.
 Entry describeEntry(Place const& place, Kind kind, ListedName const& listed);

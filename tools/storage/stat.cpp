@@ -3,6 +3,7 @@
 #include <tools/storage/commands.hpp>
 #include <tools/storage/entries.hpp>
 #include <tools/storage/format.hpp>
+#include <tools/storage/printable.hpp>
 
 #include <fl/i18n/utf8.hpp>
 #include <fmt/format.h>
@@ -20,8 +21,15 @@ struct Options
 
 void printField(Session& session, std::string_view name, std::string_view value)
 {
-    session.output().write(fmt::format("  {:<9} ", name));
+    session.output().write(fmt::format("  {:<10} ", name));
     session.printName(value);
+}
+
+/// Escaped for a terminal or not: a value may hold line ends.
+void printAttribute(Session& session, Attribute const& attribute)
+{
+    session.output().write(fmt::format("  {:<10} {}", printable(attribute.name), toText(attribute)));
+    session.output().endLine();
 }
 
 void print(Session& session, Place const& place, Entry const& entry)
@@ -35,11 +43,13 @@ void print(Session& session, Place const& place, Entry const& entry)
         printField(session, "modified", formatTime(*entry.modified, Precision::Microseconds));
     if (entry.isWritable)
         printField(session, "writable", *entry.isWritable ? "yes" : "no");
+    for (Attribute const& attribute : entry.attributes)
+        printAttribute(session, attribute);
 }
 
 void describe(Session& session, Options const& options, Place const& place)
 {
-    Entry const entry = describeEntry(place);
+    Entry const entry = describeFully(place);
     if (!options.isJSON) {
         print(session, place, entry);
         return;
