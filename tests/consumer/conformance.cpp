@@ -1,30 +1,29 @@
 #include <storage/conformance/registerConformance.hpp>
-#include <storage/local/LocalProvider.hpp>
+#include <storage/memory/MemoryProvider.hpp>
 
-#include <cerrno>
-#include <filesystem>
 #include <memory>
-#include <stdlib.h>
-#include <string>
-#include <system_error>
 
 using namespace foundation::storage;
 
 conformance::Place makePlace()
 {
-    std::string path = std::filesystem::temp_directory_path() / "conformance-XXXXXX";
-    if (::mkdtemp(path.data()) == nullptr)
-        throw std::system_error(errno, std::generic_category(), path);
-    auto const remove = [path](void*) { std::filesystem::remove_all(path); };
-    return {.provider = std::make_shared<local::LocalProvider>(),
-            .folder = provider::StorageIRI(u"file://" + std::u16string(path.begin(), path.end())),
-            .owner = std::shared_ptr<void>(nullptr, remove)};
+    provider::StorageIRI const root(u"mem://conformance/");
+    return {.provider = std::make_shared<memory::MemoryProvider>(root), .folder = root, .owner = {}};
 }
 
 conformance::Harness harness()
 {
     return {.makePlace = makePlace,
-            .capabilities = {.copyOntoItself = conformance::CopyOntoItself::ChangesNothing, .longestName = 255}};
+            .capabilities = {.recursiveRemoval = true,
+                             .recursiveListing = true,
+                             .atomicCopy = true,
+                             .copyOntoItself = conformance::CopyOntoItself::ChangesNothing,
+                             .patterns = conformance::Patterns::Globs,
+                             .settableTimes = boost::posix_time::microseconds(1),
+                             .settableWritability = true,
+                             .enforcedWritability = true,
+                             .fileEvents = true,
+                             .folderEvents = true}};
 }
 
-FOUNDATION_STORAGE_CONFORMANCE(Local, harness());
+FOUNDATION_STORAGE_CONFORMANCE(Memory, harness());
