@@ -72,7 +72,7 @@ function objection(from, to) {
     to = quoted ? area(resolved(file, path)) : included_area(path)
 
     why = objection(from, to)
-    if (why == "" && from != to && from != "tests" && to != "other" && to != "boost" && ("/" path) ~ /\/detail\//)
+    if (why == "" && from != to && from != "tests" && from != "bench" && to != "other" && to != "boost" && ("/" path) ~ /\/detail\//)
         why = "detail/ is for " to " itself"
     if (why != "") {
         print file ":" line ": " path ": " why

@@ -67,6 +67,7 @@ allowed tools/storage/ls.cpp <tools/storage/Output.hpp>
 refused tools/storage/ls.cpp <storage/local/detail/Errno.hpp>
 refused tools/storage/ls.cpp <tests/support/TemporaryFolder.hpp>
 refused examples/list.cpp <tools/storage/Output.hpp>
+allowed bench/opening.cpp <storage/local/detail/Root.hpp>
 refused bench/Addresses.cpp <tests/support/Allocations.hpp>
 
 allowed tests/storage/local/ErrnoTest.cpp <storage/local/detail/Errno.hpp>
