@@ -19,6 +19,7 @@ namespace foundation::storage::local {
 
 using namespace provider;
 using namespace detail;
+using fl::filesystem::Wildcards;
 
 namespace {
 
@@ -223,34 +224,70 @@ std::unique_ptr<ByteStream> LocalProvider::doOpenReadOnlyStream(StorageIRI const
     return openForReading(*root(), iri);
 }
 
+IProvider::Listing LocalProvider::list(StorageIRI const& folder, Selection selection) const
+{
+    return std::make_unique<LocalListing>(root(), folder, std::move(selection));
+}
+
 IProvider::Listing LocalProvider::doListAll(StorageIRI const& folder) const
 {
-    return std::make_unique<LocalListing>(root(), folder, Entries::All, Detail::Attributes);
+    return list(folder, {});
+}
+
+IProvider::Listing LocalProvider::doListAllWildcards(StorageIRI const& folder, std::u16string pattern) const
+{
+    return list(folder, {.pattern = Wildcards(pattern)});
 }
 
 IProvider::Listing LocalProvider::doListFiles(StorageIRI const& folder) const
 {
-    return std::make_unique<LocalListing>(root(), folder, Entries::Files, Detail::Attributes);
+    return list(folder, {.entries = Entries::Files});
+}
+
+IProvider::Listing LocalProvider::doListFilesWildcards(StorageIRI const& folder, std::u16string pattern) const
+{
+    return list(folder, {.entries = Entries::Files, .pattern = Wildcards(pattern)});
 }
 
 IProvider::Listing LocalProvider::doListFolders(StorageIRI const& folder) const
 {
-    return std::make_unique<LocalListing>(root(), folder, Entries::Folders, Detail::Attributes);
+    return list(folder, {.entries = Entries::Folders});
+}
+
+IProvider::Listing LocalProvider::doListFoldersWildcards(StorageIRI const& folder, std::u16string pattern) const
+{
+    return list(folder, {.entries = Entries::Folders, .pattern = Wildcards(pattern)});
 }
 
 IProvider::Listing LocalProvider::doListAllNamesOnly(StorageIRI const& folder) const
 {
-    return std::make_unique<LocalListing>(root(), folder, Entries::All, Detail::NamesOnly);
+    return list(folder, {.detail = Detail::NamesOnly});
 }
 
-IProvider::Listing LocalProvider::doListFilesNamesOnly(StorageIRI const& folder) const
+IProvider::Listing LocalProvider::doListAllNamesOnlyWildcards(StorageIRI const& folder, std::u16string pattern) const
 {
-    return std::make_unique<LocalListing>(root(), folder, Entries::Files, Detail::NamesOnly);
+    return list(folder, {.detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
 }
 
 IProvider::Listing LocalProvider::doListFoldersNamesOnly(StorageIRI const& folder) const
 {
-    return std::make_unique<LocalListing>(root(), folder, Entries::Folders, Detail::NamesOnly);
+    return list(folder, {.entries = Entries::Folders, .detail = Detail::NamesOnly});
+}
+
+IProvider::Listing LocalProvider::doListFoldersNamesOnlyWildcards(StorageIRI const& folder,
+                                                                  std::u16string pattern) const
+{
+    return list(folder, {.entries = Entries::Folders, .detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
+}
+
+IProvider::Listing LocalProvider::doListFilesNamesOnly(StorageIRI const& folder) const
+{
+    return list(folder, {.entries = Entries::Files, .detail = Detail::NamesOnly});
+}
+
+IProvider::Listing LocalProvider::doListFilesNamesOnlyWildcards(StorageIRI const& folder, std::u16string pattern) const
+{
+    return list(folder, {.entries = Entries::Files, .detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
 }
 
 } // namespace foundation::storage::local

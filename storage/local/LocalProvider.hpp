@@ -12,6 +12,7 @@ namespace foundation::storage::local {
 
 namespace detail {
 class Root;
+struct Selection;
 struct Settings;
 } // namespace detail
 
@@ -63,15 +64,22 @@ protected:
     std::unique_ptr<provider::ByteStream> doOpenReadOnlyStream(provider::StorageIRI const& iri) const override;
 
     Listing doListAll(provider::StorageIRI const& folder) const override;
+    Listing doListAllWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
     Listing doListFiles(provider::StorageIRI const& folder) const override;
+    Listing doListFilesWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
     Listing doListFolders(provider::StorageIRI const& folder) const override;
+    Listing doListFoldersWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
     Listing doListAllNamesOnly(provider::StorageIRI const& folder) const override;
-    Listing doListFilesNamesOnly(provider::StorageIRI const& folder) const override;
+    Listing doListAllNamesOnlyWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
     Listing doListFoldersNamesOnly(provider::StorageIRI const& folder) const override;
+    Listing doListFoldersNamesOnlyWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
+    Listing doListFilesNamesOnly(provider::StorageIRI const& folder) const override;
+    Listing doListFilesNamesOnlyWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
 
 private:
     std::shared_ptr<detail::Settings const> settings() const;
     std::shared_ptr<detail::Root const> root() const;
+    Listing list(provider::StorageIRI const& folder, detail::Selection selection) const;
 
     mutable std::mutex mutex_;
     std::shared_ptr<detail::Settings const> settings_;

@@ -15,7 +15,21 @@ auto deferredWritability(std::shared_ptr<Root const> root, std::string path)
     return [root = std::move(root), path = std::move(path)] { return root->checkAccess(path, W_OK) == 0; };
 }
 
+auto deferredWritability(std::shared_ptr<FolderPath const> folder, std::string_view name)
+{
+    return [folder = std::move(folder), name = std::string(name)] {
+        return folder->root->checkAccess(folder->pathOf(name), W_OK) == 0;
+    };
+}
+
 } // namespace
+
+std::string FolderPath::pathOf(std::string_view name) const
+{
+    std::string result = path;
+    result += '/';
+    return result += name;
+}
 
 posix_time::ptime toPtime(struct statx_timestamp const& time)
 {
@@ -49,6 +63,19 @@ provider::FileAttributes toFileAttributes(Status const& status, std::shared_ptr<
 provider::FolderAttributes toFolderAttributes(Status const& status, std::shared_ptr<Root const> root, std::string path)
 {
     return provider::FolderAttributes(toPtime(status.stx_mtime), deferredWritability(std::move(root), std::move(path)));
+}
+
+provider::FileAttributes toFileAttributes(Status const& status, std::shared_ptr<FolderPath const> folder,
+                                          std::string_view name)
+{
+    return provider::FileAttributes(status.stx_size, toPtime(status.stx_mtime),
+                                    deferredWritability(std::move(folder), name));
+}
+
+provider::FolderAttributes toFolderAttributes(Status const& status, std::shared_ptr<FolderPath const> folder,
+                                              std::string_view name)
+{
+    return provider::FolderAttributes(toPtime(status.stx_mtime), deferredWritability(std::move(folder), name));
 }
 
 } // namespace foundation::storage::local::detail

@@ -10,6 +10,7 @@
 #include <ctime>
 #include <memory>
 #include <string>
+#include <string_view>
 
 namespace foundation::storage::local::detail {
 
@@ -19,8 +20,21 @@ FOUNDATION_API boost::posix_time::ptime toPtime(struct statx_timestamp const& ti
 /// The other way round, for any time that is not special.
 FOUNDATION_API timespec toTimespec(boost::posix_time::ptime const& time);
 
-/// `path` is where writability is asked for, when somebody asks.
+/// Where a folder is, for what is asked about its entries when it may not be open any more.
+struct FolderPath
+{
+    std::shared_ptr<Root const> root;
+    std::string path;
+
+    std::string pathOf(std::string_view name) const;
+};
+
+/// `path`, or `name` in `folder`, is where writability is asked for, when somebody asks.
 provider::FileAttributes toFileAttributes(Status const& status, std::shared_ptr<Root const> root, std::string path);
 provider::FolderAttributes toFolderAttributes(Status const& status, std::shared_ptr<Root const> root, std::string path);
+provider::FileAttributes toFileAttributes(Status const& status, std::shared_ptr<FolderPath const> folder,
+                                          std::string_view name);
+provider::FolderAttributes toFolderAttributes(Status const& status, std::shared_ptr<FolderPath const> folder,
+                                              std::string_view name);
 
 } // namespace foundation::storage::local::detail

@@ -46,6 +46,7 @@ Harness localHarness()
     return {
         .makePlace = makePlace,
         .capabilities = {.copyOntoItself = CopyOntoItself::ChangesNothing,
+                         .patterns = Patterns::Globs,
                          .settableTimes = boost::posix_time::microseconds(1),
                          .settableWritability = true,
                          .enforcedWritability = permissionsBind,

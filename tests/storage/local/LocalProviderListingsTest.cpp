@@ -14,6 +14,7 @@
 #include <filesystem>
 #include <set>
 #include <string>
+#include <string_view>
 #include <sys/stat.h>
 #include <vector>
 
@@ -284,6 +285,26 @@ TEST_F(LocalProviderLargeListings, SurviveTheRemovalOfTheirEntries)
                 fs::remove(folder / name);
     }
     EXPECT_EQ(walked, 10u);
+}
+
+TEST_F(LocalProviderListings, EndWhereTheFolderIsRemoved)
+{
+    fs::create_directory(folder / "removed");
+    auto const listing = provider.listAll(folder.iri(u"removed"));
+    fs::remove(folder / "removed");
+    listing->reset();
+    EXPECT_FALSE(listing->hasEntry());
+}
+
+TEST_F(LocalProviderListings, PassOverWhatVanishesBeforeItIsAskedAbout)
+{
+    ReplacedSystemCalls replaced;
+    replaced->statx = [](int at, char const* path, int flags, unsigned mask, struct statx* result) {
+        return std::string_view(path) == "folder" ? realSystemCalls.statx(at, path, flags, mask, result)
+                                                  : failWith(ENOENT);
+    };
+    EXPECT_EQ(namesOf(provider.listAll(folder.iri())), Names{"folder/"});
+    EXPECT_EQ(namesOf(provider.listFoldersNamesOnly(folder.iri())), Names{"folder/"});
 }
 
 TEST_F(LocalProviderListings, SeeWhatBecameOfTheFolderWhenTheyStartAgain)

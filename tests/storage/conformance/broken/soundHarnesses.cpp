@@ -108,6 +108,11 @@ protected:
         return feature == ExtendedFeature::RecursiveFolderRemoval || target().hasFeature(feature);
     }
 
+    Listing list(char const* name, ListingOperation operation, Iri folder, std::u16string) const override
+    {
+        return ForwardingProvider::list(name, operation, folder, {});
+    }
+
     Listing doListAllRecursive(Iri folder) const override
     {
         std::vector<FolderEntry> found;
@@ -207,6 +212,7 @@ Harness recursiveHarness()
 {
     Harness harness =
         wrapped(localHarness(), [](auto const& store) { return std::make_shared<RecursiveProvider>(store); });
+    harness.capabilities.patterns = Patterns::Ignored;
     harness.capabilities.recursiveListing = true;
     harness.capabilities.recursiveRemoval = true;
     return harness;

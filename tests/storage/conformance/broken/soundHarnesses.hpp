@@ -12,7 +12,7 @@ Harness plainHarness();
 /// A provider that never changes.
 Harness readOnlyHarness();
 
-/// Local files, links among them, with recursive listing and removal.
+/// Local files, links among them, with recursive listing and removal, and without patterns.
 Harness recursiveHarness();
 
 /// Local files, links among them, with atomic copies.

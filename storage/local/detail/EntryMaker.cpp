@@ -1,0 +1,72 @@
+#include <storage/local/detail/EntryMaker.hpp>
+
+#include <fl/filesystem/native_name.hpp>
+#include <storage/local/detail/fileSystem.hpp>
+
+#include <cerrno>
+#include <utility>
+
+namespace foundation::storage::local::detail {
+
+using provider::FolderEntry;
+
+namespace {
+
+/// In a confined store a link is followed by its path, because only the root knows where it must not lead.
+int getTargetStatus(ListedFolder const& folder, char const* name, Status& status)
+{
+    Root const& root = *folder.path->root;
+    At const at{folder.descriptor, name};
+    if (!root.isConfined())
+        return getStatus(at, Links::Follow, status);
+    int const error = getStatus(at, Links::Keep, status);
+    return error == 0 && isLink(status) ? root.getStatus(folder.path->pathOf(name), Links::Follow, status) : error;
+}
+
+bool leadsToFolder(ListedFolder const& folder, FoundName const& found)
+{
+    if (found.isDecided())
+        return found.isFolder();
+    Status status;
+    return getTargetStatus(folder, found.name.data(), status) == 0 && isFolder(status);
+}
+
+} // namespace
+
+int EntryMaker::make(ListedFolder const& folder, FoundName const& found, std::optional<FolderEntry>& entry) const
+{
+    entry.reset();
+    if (found.isDecided() && !selection_.wantsKind(found.isFolder()))
+        return 0;
+    std::u16string name = fl::filesystem::from_native_bytes(found.name);
+    if (!selection_.wantsName(name))
+        return 0;
+    if (!folder.prefix.empty())
+        name.insert(0, folder.prefix);
+    if (selection_.detail == Detail::Attributes)
+        return makeWithAttributes(folder, found, std::move(name), entry);
+    bool const isFolder = leadsToFolder(folder, found);
+    if (selection_.wantsKind(isFolder))
+        entry.emplace(std::move(name), isFolder ? FolderEntry::EntryType::Folder : FolderEntry::EntryType::File);
+    return 0;
+}
+
+int EntryMaker::makeWithAttributes(ListedFolder const& folder, FoundName const& found, std::u16string name,
+                                   std::optional<FolderEntry>& entry) const
+{
+    Status status;
+    if (getTargetStatus(folder, found.name.data(), status) != 0) {
+        int const error = getStatus({folder.descriptor, found.name.data()}, Links::Keep, status);
+        if (error != 0)
+            return error == ENOENT ? 0 : error;
+    }
+    if (!selection_.wantsKind(isFolder(status)))
+        return 0;
+    if (isFolder(status))
+        entry.emplace(std::move(name), toFolderAttributes(status, folder.path, found.name));
+    else
+        entry.emplace(std::move(name), toFileAttributes(status, folder.path, found.name));
+    return 0;
+}
+
+} // namespace foundation::storage::local::detail
