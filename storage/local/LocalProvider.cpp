@@ -2,6 +2,7 @@
 
 #include <storage/local/detail/LocalByteStream.hpp>
 #include <storage/local/detail/LocalListing.hpp>
+#include <storage/local/detail/LocalTransaction.hpp>
 #include <storage/local/detail/Root.hpp>
 #include <storage/local/detail/Settings.hpp>
 #include <storage/local/detail/attributes.hpp>
@@ -227,6 +228,13 @@ std::unique_ptr<ByteStream> LocalProvider::doOpenReadOnlyStream(StorageIRI const
 IProvider::Listing LocalProvider::list(StorageIRI const& folder, Selection selection) const
 {
     return std::make_unique<LocalListing>(root(), folder, std::move(selection));
+}
+
+std::unique_ptr<TransactionalStream>
+LocalProvider::doOpenTransactionalStreamAtScratchLocation(StorageIRI const& target, StorageIRI const& scratch,
+                                                          ByteStreamOpenOptions const& options) const
+{
+    return std::make_unique<LocalTransaction>(settings(), target, scratch, options);
 }
 
 IProvider::Listing LocalProvider::doListAll(StorageIRI const& folder) const

@@ -62,6 +62,9 @@ protected:
     std::unique_ptr<provider::ByteStream> doOpenStream(provider::StorageIRI const& iri,
                                                        provider::ByteStreamOpenOptions const& options) const override;
     std::unique_ptr<provider::ByteStream> doOpenReadOnlyStream(provider::StorageIRI const& iri) const override;
+    std::unique_ptr<provider::TransactionalStream>
+    doOpenTransactionalStreamAtScratchLocation(provider::StorageIRI const& target, provider::StorageIRI const& scratch,
+                                               provider::ByteStreamOpenOptions const& options) const override;
 
     Listing doListAll(provider::StorageIRI const& folder) const override;
     Listing doListAllWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;

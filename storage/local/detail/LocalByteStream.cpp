@@ -18,18 +18,6 @@ namespace {
 /// Without `O_NONBLOCK` opening a pipe would wait for somebody at its other end. It means nothing to a file.
 constexpr int commonFlags = O_NOCTTY | O_NONBLOCK;
 
-int flagsOf(ByteStreamOpenOptions const& options)
-{
-    int flags = options.access == ByteStreamAccess::ReadWrite ? O_RDWR : O_WRONLY;
-    if (options.create == ByteStreamCreate::Create)
-        flags |= O_CREAT;
-    if (options.truncate == ByteStreamTruncate::TruncateExisting)
-        flags |= O_TRUNC;
-    if (options.append == ByteStreamAppend::Append)
-        flags |= O_APPEND;
-    return flags;
-}
-
 [[noreturn]] void throwCannotOpen(int error, StorageIRI const& iri)
 {
     if (error == EISDIR)
@@ -83,54 +71,71 @@ void LocalStreamFailure::rethrow() const
     throw LocalStreamFailure(*this);
 }
 
-LocalByteStream::LocalByteStream(FileDescriptor file, std::string path) : file_(std::move(file)), path_(std::move(path))
+DescriptorStream::DescriptorStream(int descriptor, std::string path) : descriptor_(descriptor), path_(std::move(path))
 {}
 
-void LocalByteStream::requireOpen(char const* attempt, long count) const
+void DescriptorStream::requireOpen(char const* attempt, long count) const
 {
-    if (!file_.isOpen())
+    if (descriptor_ == -1)
         throw LocalStreamFailure(std::string(attempt) + " closed stream of", path_, EBADF);
     if (count < 0)
         throw LocalStreamFailure(attempt, path_, EINVAL);
 }
 
-long LocalByteStream::doRead(char* buffer, long count)
+long DescriptorStream::doRead(char* buffer, long count)
 {
     requireOpen("read", count);
     if (count == 0)
         return 0;
     long const result =
-        retried([&] { return systemCalls().read(file_.get(), buffer, static_cast<std::size_t>(count)); });
+        retried([&] { return systemCalls().read(descriptor_, buffer, static_cast<std::size_t>(count)); });
     if (result == -1)
         throw LocalStreamFailure("read", path_, errno);
     return result == 0 ? -1 : result;
 }
 
-long LocalByteStream::doWrite(char const* data, long count)
+long DescriptorStream::doWrite(char const* data, long count)
 {
     requireOpen("write", count);
     if (count == 0)
         return 0;
     long const result =
-        retried([&] { return systemCalls().write(file_.get(), data, static_cast<std::size_t>(count)); });
+        retried([&] { return systemCalls().write(descriptor_, data, static_cast<std::size_t>(count)); });
     if (result == -1)
         throw LocalStreamFailure("write", path_, errno);
     return result;
 }
 
-long LocalByteStream::doSeek(long offset, std::ios_base::seekdir direction)
+long DescriptorStream::doSeek(long offset, std::ios_base::seekdir direction)
 {
     requireOpen("seek in");
-    long const position = systemCalls().lseek(file_.get(), offset, toOrigin(direction));
+    long const position = systemCalls().lseek(descriptor_, offset, toOrigin(direction));
     if (position == -1)
         throw LocalStreamFailure("seek in", path_, errno);
     return position;
 }
 
+LocalByteStream::LocalByteStream(FileDescriptor file, std::string path)
+    : DescriptorStream(file.get(), std::move(path)), file_(std::move(file))
+{}
+
 void LocalByteStream::doClose()
 {
+    forgetDescriptor();
     if (int const error = file_.close())
-        throw LocalStreamFailure("close", path_, error);
+        throw LocalStreamFailure("close", path(), error);
+}
+
+int openFlags(ByteStreamOpenOptions const& options)
+{
+    int flags = options.access == ByteStreamAccess::ReadWrite ? O_RDWR : O_WRONLY;
+    if (options.create == ByteStreamCreate::Create)
+        flags |= O_CREAT;
+    if (options.truncate == ByteStreamTruncate::TruncateExisting)
+        flags |= O_TRUNC;
+    if (options.append == ByteStreamAppend::Append)
+        flags |= O_APPEND;
+    return flags;
 }
 
 std::unique_ptr<ByteStream> openForReading(Root const& root, StorageIRI const& iri)
@@ -145,7 +150,7 @@ std::unique_ptr<ByteStream> openForWriting(Root const& root, StorageIRI const& i
                                            ByteStreamOpenOptions const& options)
 {
     std::string path = root.pathOf(iri);
-    FileDescriptor file = openContent(root, path, flagsOf(options), iri);
+    FileDescriptor file = openContent(root, path, openFlags(options), iri);
     return std::make_unique<LocalByteStream>(std::move(file), std::move(path));
 }
 

@@ -23,29 +23,47 @@ public:
     [[noreturn]] void rethrow() const override;
 };
 
-/// The content of an open file.
-class LocalByteStream final : public provider::ByteStream
+/// The content of an open file, which a subclass owns.
+class DescriptorStream : public provider::ByteStream
 {
-public:
-    /// `path` is what failures name.
-    LocalByteStream(FileDescriptor file, std::string path);
-
 protected:
+    /// `path` is what failures name.
+    DescriptorStream(int descriptor, std::string path);
+
     long doRead(char* buffer, long count) override;
     long doWrite(char const* data, long count) override;
 
     /// Positions beyond the end are allowed; what is written there leaves a hole that reads as zeros.
     long doSeek(long offset, std::ios_base::seekdir direction) override;
 
-    /// Reports what the operating system could not write back; the stream is closed all the same.
-    void doClose() override;
+    /// From then on everything fails with `IOError`.
+    void forgetDescriptor() { descriptor_ = -1; }
+
+    std::string const& path() const { return path_; }
 
 private:
     void requireOpen(char const* attempt, long count = 0) const;
 
-    FileDescriptor file_;
+    int descriptor_;
     std::string path_;
 };
+
+/// The content of a file of its own.
+class LocalByteStream final : public DescriptorStream
+{
+public:
+    LocalByteStream(FileDescriptor file, std::string path);
+
+protected:
+    /// Reports what the operating system could not write back; the stream is closed all the same.
+    void doClose() override;
+
+private:
+    FileDescriptor file_;
+};
+
+/// What `open` is given for these options.
+int openFlags(provider::ByteStreamOpenOptions const& options);
 
 /// Both throw `Exception`: `ResourceNotFound` for a folder, `UnsupportedOperation` for what is neither file nor folder.
 std::unique_ptr<provider::ByteStream> openForReading(Root const& root, provider::StorageIRI const& iri);

@@ -52,6 +52,9 @@ public:
     /// `PermissionDenied` for one that does not lie beneath the folder.
     std::string pathOf(provider::StorageIRI const& iri) const;
 
+    /// Whether a path names the folder above which there is none.
+    bool isTop(std::string const& path) const { return path == (isConfined() ? path_ : "/"); }
+
     /// Opens what a path leads to. A new file gets `mode`, less the umask.
     [[nodiscard]] int open(std::string const& path, int flags, FileDescriptor& file, mode_t mode = newFileMode) const;
 

@@ -18,6 +18,7 @@ constinit SystemCalls const realSystemCalls{
     .openat2 = [](int folder, char const* path, open_how const* how,
                   std::size_t size) { return static_cast<int>(::syscall(SYS_openat2, folder, path, how, size)); },
     .close = ::close,
+    .dup = [](int descriptor) { return ::fcntl(descriptor, F_DUPFD_CLOEXEC, 0); },
     .read = ::read,
     .write = ::write,
     .lseek = ::lseek,

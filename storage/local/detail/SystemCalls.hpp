@@ -16,12 +16,13 @@ namespace foundation::storage::local::detail {
 /// Every call that this provider makes to the operating system, as a table that tests put their own functions into.
 ///
 /// Each function behaves as the POSIX or Linux call of its name: -1 and `errno` for a failure, except `fadvise`, whose
-/// result nobody looks at. `ficlone` is the request `FICLONE` of `ioctl`.
+/// result nobody looks at, and `dup`, whose result is closed on exec. `ficlone` is the request `FICLONE` of `ioctl`.
 struct SystemCalls
 {
     int (*openat)(int folder, char const* path, int flags, mode_t mode);
     int (*openat2)(int folder, char const* path, open_how const* how, std::size_t size);
     int (*close)(int descriptor);
+    int (*dup)(int descriptor);
     ssize_t (*read)(int descriptor, void* buffer, std::size_t count);
     ssize_t (*write)(int descriptor, void const* data, std::size_t count);
     off_t (*lseek)(int descriptor, off_t offset, int origin);

@@ -2,9 +2,7 @@
 
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/fileSystem.hpp>
-
-#include <boost/uuid/random_generator.hpp>
-#include <boost/uuid/uuid_io.hpp>
+#include <storage/local/detail/scratchName.hpp>
 
 #include <cerrno>
 #include <cstdio>
@@ -49,11 +47,6 @@ std::string parentOf(std::string const& path)
     return path.substr(0, nameStart(path));
 }
 
-std::string scratchName()
-{
-    return boost::uuids::to_string(boost::uuids::random_generator()()) + ".tmp.bak";
-}
-
 /// The end of a move that is to blame for an error that does not say.
 StorageIRI const& culprit(int error, Move const& move)
 {
@@ -94,13 +87,13 @@ bool lacksNoReplace(int error)
 }
 
 /// For a file system without `RENAME_NOREPLACE`: a second name is never made over an existing one either.
-int moveFileBySecondName(Move const& move)
+int moveFileBySecondName(At const& from, At const& to)
 {
-    if (int const error = addName(move.source.at(), move.target.at()))
+    if (int const error = addName(from, to))
         return error == EPERM ? EOPNOTSUPP : error;
-    int const error = removeName(move.source.at());
+    int const error = removeName(from);
     if (error != 0)
-        removeName(move.target.at());
+        removeName(to);
     return error;
 }
 
@@ -132,12 +125,6 @@ int moveBetweenNames(Move const& move)
     else
         removeName(scratch.at());
     return error;
-}
-
-int moveFileWithoutReplacing(Move const& move)
-{
-    int const error = renameEntry(move.source.at(), move.target.at(), RENAME_NOREPLACE);
-    return lacksNoReplace(error) ? moveFileBySecondName(move) : error;
 }
 
 /// Renamed over that file the link would lead to itself, and the content be lost.
@@ -175,13 +162,21 @@ bool replaces(ReplacementPolicy policy)
     return policy == ReplacementPolicy::Overwrite || policy == ReplacementPolicy::Clobber;
 }
 
+int moveFileWithoutReplacing(At const& from, At const& to)
+{
+    int const error = renameEntry(from, to, RENAME_NOREPLACE);
+    return lacksNoReplace(error) ? moveFileBySecondName(from, to) : error;
+}
+
 void moveFile(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
 {
     Move const move(root, from, to);
     Status const source = requireSource(move);
     if (isFolder(source))
         throwError(ErrorCode::ResourceNotFound, from);
-    requireMoved(replaces(policy) ? moveFileReplacing(move, source) : moveFileWithoutReplacing(move), move);
+    requireMoved(replaces(policy) ? moveFileReplacing(move, source)
+                                  : moveFileWithoutReplacing(move.source.at(), move.target.at()),
+                 move);
 }
 
 void moveFolder(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)

@@ -1,12 +1,17 @@
 #pragma once
 
 #include <storage/local/detail/Root.hpp>
+#include <storage/local/detail/fileSystem.hpp>
 #include <storage/provider/ReplacementPolicy.hpp>
 #include <storage/provider/StorageIRI.hpp>
 
 namespace foundation::storage::local::detail {
 
 bool replaces(provider::ReplacementPolicy policy);
+
+/// Gives what is no folder another name, in one step where the file system can: `EEXIST` when that is taken, even by
+/// somebody who was faster by a moment. Answers 0 or `errno`.
+[[nodiscard]] int moveFileWithoutReplacing(At const& from, At const& to);
 
 void moveFile(Root const& root, provider::StorageIRI const& from, provider::StorageIRI const& to,
               provider::ReplacementPolicy policy);

@@ -1,0 +1,226 @@
+#include <storage/local/detail/ScratchFile.hpp>
+
+#include <storage/local/detail/errorCode.hpp>
+#include <storage/local/detail/move.hpp>
+#include <storage/local/detail/scratchName.hpp>
+#include <storage/local/detail/sync.hpp>
+
+#include <cerrno>
+
+namespace foundation::storage::local::detail {
+
+using provider::ErrorCode;
+using provider::ReplacementPolicy;
+using provider::StorageIRI;
+
+namespace {
+
+constexpr unsigned permissionBits = 0777;
+
+std::string parentOf(std::string const& path)
+{
+    return path.substr(0, path.rfind('/') + 1);
+}
+
+std::string nameOf(std::string const& path)
+{
+    return path.substr(path.rfind('/') + 1);
+}
+
+} // namespace
+
+ScratchFile::ScratchFile(Root const& root, StorageIRI const& target, Durability durability, int flags, mode_t mode)
+    : root_(root),
+      target_(target),
+      scratch_(target),
+      path_(root.pathOf(target)),
+      name_(nameOf(path_)),
+      scratchName_(detail::scratchName()),
+      durability_(durability)
+{
+    openFolders(path_);
+    int const error = openFile(scratchAt(), flags | O_CREAT | O_EXCL | O_NOFOLLOW, file_, modeForNew(mode));
+    if (error != 0)
+        throwError(error, scratch_);
+}
+
+ScratchFile::ScratchFile(Root const& root, StorageIRI const& target, StorageIRI const& scratch, Durability durability,
+                         int flags)
+    : root_(root),
+      target_(target),
+      scratch_(scratch),
+      path_(root.pathOf(target)),
+      name_(nameOf(path_)),
+      durability_(durability)
+{
+    std::string const scratchPath = root.pathOf(scratch);
+    scratchName_ = nameOf(scratchPath);
+    openFolders(scratchPath);
+    openScratch(flags);
+}
+
+ScratchFile::~ScratchFile()
+{
+    if (state_ == State::Writing)
+        removeName(scratchAt());
+}
+
+At ScratchFile::scratchAt() const
+{
+    FileDescriptor const& folder = scratchFolder_.isOpen() ? scratchFolder_ : folder_;
+    return {folder.get(), scratchName_.c_str()};
+}
+
+/// A folder can be synced only by who may read it.
+void ScratchFile::openFolders(std::string const& scratchPath)
+{
+    if (root_.isTop(path_))
+        throwError(ErrorCode::ResourceAlreadyExists, target_);
+    std::string const parent = parentOf(path_);
+    int error = EACCES;
+    if (durability_ == Durability::Full)
+        error = root_.open(parent, O_RDONLY | O_DIRECTORY, folder_);
+    isFolderReadable_ = error == 0;
+    if (error == EACCES)
+        error = root_.open(parent, O_PATH | O_DIRECTORY, folder_);
+    if (error == 0 && parentOf(scratchPath) != parent)
+        error = root_.open(parentOf(scratchPath), O_PATH | O_DIRECTORY, scratchFolder_);
+    if (error != 0)
+        throwError(error, scratch_);
+}
+
+/// A new name is nobody's: not a link that somebody has put there, and not another writer's file.
+void ScratchFile::openScratch(int flags)
+{
+    int error = EEXIST;
+    if ((flags & O_CREAT) != 0)
+        error = openFile(scratchAt(), flags | O_EXCL | O_NOFOLLOW, file_, modeForNew(newFileMode));
+    if (error == EEXIST)
+        error = openExisting(flags & ~O_CREAT);
+    if (error == EISDIR)
+        throwError(ErrorCode::ResourceNotFound, scratch_);
+    if (error != 0)
+        throwError(error, scratch_);
+}
+
+int ScratchFile::openExisting(int flags)
+{
+    if (int const error = openFile(scratchAt(), flags | O_NOFOLLOW | O_NOCTTY | O_NONBLOCK, file_))
+        return error;
+    Status status;
+    if (int const error = getStatus(file_, status))
+        return error;
+    return S_ISREG(status.stx_mode) ? 0 : EOPNOTSUPP;
+}
+
+/// What stands at the target, or what a link there leads to.
+int ScratchFile::findTarget(Status& status) const
+{
+    if (int const error = getStatus(targetAt(), Links::Keep, status))
+        return error;
+    bool const isLost = isLink(status) && root_.getStatus(path_, Links::Follow, status) != 0;
+    return isLost ? ENOENT : 0;
+}
+
+/// The content of a file that others may not read is not for them while it is being written either.
+mode_t ScratchFile::modeForNew(mode_t mode) const
+{
+    Status target;
+    return findTarget(target) == 0 && S_ISREG(target.stx_mode) ? target.stx_mode & permissionBits : mode;
+}
+
+void ScratchFile::commit(ReplacementPolicy policy)
+{
+    if (state_ == State::Writing) {
+        if (replaces(policy))
+            keepPermissions();
+        // Before the name, or a power failure could leave the name without the content.
+        writeContentBack();
+        putInPlace(policy);
+        state_ = State::InPlace;
+    }
+    // Until then a power failure can bring the old content back.
+    int const error = durability_ == Durability::Full && state_ == State::InPlace ? syncFolder() : 0;
+    if (error != 0)
+        throwNotDurable(error, target_);
+    finish();
+}
+
+/// Before the content is synced, which syncs the permissions too.
+void ScratchFile::keepPermissions()
+{
+    Status target;
+    int const error = findTarget(target);
+    if (error != 0 && !meansMissing(error))
+        throwError(error, target_);
+    if (error == 0 && isFolder(target))
+        throwError(ErrorCode::ResourceAlreadyExists, target_);
+    if (error == 0 && S_ISREG(target.stx_mode))
+        setPermissions(target.stx_mode & permissionBits);
+}
+
+void ScratchFile::setPermissions(mode_t mode)
+{
+    Status scratch;
+    int error = getStatus(file_, scratch);
+    if (error == 0 && (scratch.stx_mode & permissionBits) != mode)
+        error = errorOf([&] { return systemCalls().fchmod(file_.get(), mode); });
+    if (error != 0)
+        throwError(error, target_);
+}
+
+/// Closing reports what a file system over the network could not write. The file stays open: that is how others know
+/// that somebody needs it.
+int ScratchFile::closeDuplicate()
+{
+    FileDescriptor duplicate(retried([&] { return systemCalls().dup(file_.get()); }));
+    if (!duplicate.isOpen())
+        throwError(errno, target_);
+    return duplicate.close();
+}
+
+/// The system reports what it lost once: a second sync would find nothing left to write, and succeed.
+void ScratchFile::writeContentBack()
+{
+    if (lost_ == 0)
+        lost_ = durability_ == Durability::None ? closeDuplicate() : sync(file_, file_);
+    if (lost_ != 0)
+        throwError(lost_, target_);
+}
+
+void ScratchFile::putInPlace(ReplacementPolicy policy)
+{
+    int error =
+        replaces(policy) ? renameEntry(scratchAt(), targetAt(), 0) : moveFileWithoutReplacing(scratchAt(), targetAt());
+    if (error == EISDIR)
+        error = EEXIST;
+    Status status;
+    if (error == ENOENT && meansMissing(getStatus(scratchAt(), Links::Keep, status)))
+        throwError(error, scratch_);
+    if (error != 0)
+        throwError(error, target_);
+}
+
+int ScratchFile::syncFolder()
+{
+    return isFolderReadable_ ? sync(folder_, file_) : syncFileSystem(file_);
+}
+
+void ScratchFile::discard()
+{
+    if (state_ == State::Writing)
+        if (int const error = removeName(scratchAt()))
+            throwError(error, scratch_);
+    finish();
+}
+
+/// The content was written back before, or is not wanted: closing has nothing to report.
+void ScratchFile::finish()
+{
+    state_ = State::Done;
+    file_ = FileDescriptor();
+    folder_ = FileDescriptor();
+    scratchFolder_ = FileDescriptor();
+}
+
+} // namespace foundation::storage::local::detail
