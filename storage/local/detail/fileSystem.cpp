@@ -10,7 +10,8 @@ namespace foundation::storage::local::detail {
 
 namespace {
 
-constexpr unsigned wantedFields = STATX_TYPE | STATX_MODE | STATX_NLINK | STATX_INO | STATX_SIZE | STATX_MTIME;
+constexpr unsigned wantedFields =
+    STATX_TYPE | STATX_MODE | STATX_NLINK | STATX_INO | STATX_SIZE | STATX_MTIME | STATX_BLOCKS;
 
 /// What is to be mounted on demand is not mounted for being looked at, or a listing could mount all the world.
 int askStatus(At const& at, int flags, Status& status, unsigned fields = wantedFields)
