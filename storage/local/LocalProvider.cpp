@@ -11,6 +11,7 @@
 #include <storage/local/detail/extendedAttributes.hpp>
 #include <storage/local/detail/fileSystem.hpp>
 #include <storage/local/detail/move.hpp>
+#include <storage/local/detail/sync.hpp>
 
 #include <cerrno>
 #include <optional>
@@ -69,6 +70,14 @@ Located locate(Root const& root, std::string const& path, StorageIRI const& iri)
     return entry;
 }
 
+void makeMoveDurable(Settings const& settings, StorageIRI const& from, StorageIRI const& to)
+{
+    if (settings.durability != Durability::Full)
+        return;
+    if (int const error = syncFoldersOf(settings.root, settings.root.pathOf(from), settings.root.pathOf(to)))
+        throwNotDurable(error, to);
+}
+
 } // namespace
 
 LocalProvider::LocalProvider() : settings_(std::make_shared<Settings>()) {}
@@ -105,9 +114,14 @@ void LocalProvider::doCreateFile(StorageIRI const& iri) const
 
 void LocalProvider::doCreateFolder(StorageIRI const& iri) const
 {
-    auto const root = this->root();
-    if (int const error = makeFolder(locate(*root, root->pathOf(iri), iri).at()))
+    auto const settings = this->settings();
+    Root const& root = settings->root;
+    std::string const path = root.pathOf(iri);
+    if (int const error = makeFolder(locate(root, path, iri).at()))
         throwError(error, iri);
+    if (settings->durability == Durability::Full)
+        if (int const error = syncFolderOf(root, path))
+            throwNotDurable(error, iri);
 }
 
 bool LocalProvider::doFileExists(StorageIRI const& iri) const
@@ -164,12 +178,16 @@ void LocalProvider::doRemoveFolder(StorageIRI const& iri) const
 
 void LocalProvider::doMoveFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
-    detail::moveFile(*root(), from, to, policy);
+    auto const settings = this->settings();
+    detail::moveFile(settings->root, from, to, policy);
+    makeMoveDurable(*settings, from, to);
 }
 
 void LocalProvider::doMoveFolder(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
-    detail::moveFolder(*root(), from, to, policy);
+    auto const settings = this->settings();
+    detail::moveFolder(settings->root, from, to, policy);
+    makeMoveDurable(*settings, from, to);
 }
 
 void LocalProvider::doCopyFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
