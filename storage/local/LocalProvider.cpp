@@ -1,5 +1,6 @@
 #include <storage/local/LocalProvider.hpp>
 
+#include <storage/local/detail/ChangeNotifier.hpp>
 #include <storage/local/detail/LocalByteStream.hpp>
 #include <storage/local/detail/LocalListing.hpp>
 #include <storage/local/detail/LocalTransaction.hpp>
@@ -11,7 +12,9 @@
 #include <storage/local/detail/extendedAttributes.hpp>
 #include <storage/local/detail/fileSystem.hpp>
 #include <storage/local/detail/move.hpp>
+#include <storage/local/detail/nativePath.hpp>
 #include <storage/local/detail/sync.hpp>
+#include <storage/provider/ChangeEventExceptions.hpp>
 
 #include <cerrno>
 #include <optional>
@@ -80,7 +83,8 @@ void makeMoveDurable(Settings const& settings, StorageIRI const& from, StorageIR
 
 } // namespace
 
-LocalProvider::LocalProvider() : settings_(std::make_shared<Settings>()) {}
+LocalProvider::LocalProvider() : settings_(std::make_shared<Settings>()), notifier_(std::make_unique<ChangeNotifier>())
+{}
 
 LocalProvider::~LocalProvider() = default;
 
@@ -89,6 +93,11 @@ void LocalProvider::doConfigure(boost::property_tree::ptree tree)
     auto settings = std::make_shared<Settings const>(tree);
     std::lock_guard const lock(mutex_);
     settings_.swap(settings);
+}
+
+void LocalProvider::doShutdown()
+{
+    notifier_->stopAll();
 }
 
 std::shared_ptr<Settings const> LocalProvider::settings() const
@@ -314,6 +323,41 @@ IProvider::Listing LocalProvider::doListFilesNamesOnly(StorageIRI const& folder)
 IProvider::Listing LocalProvider::doListFilesNamesOnlyWildcards(StorageIRI const& folder, std::u16string pattern) const
 {
     return list(folder, {.entries = Entries::Files, .detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
+}
+
+void LocalProvider::doPublishFolderEventsFor(StorageIRI const& folder, ChangeEventCallback const& callback,
+                                             EventKinds const& kinds) const
+{
+    auto const root = this->root();
+    notifier_->subscribe({.root = root,
+                          .path = root->pathOf(folder),
+                          .folder = folder,
+                          .subject = folder,
+                          .callback = callback,
+                          .kinds = kinds});
+}
+
+void LocalProvider::doPublishFileEventsFor(StorageIRI const& file, ChangeEventCallback const& callback,
+                                           EventKinds const& kinds) const
+{
+    auto const root = this->root();
+    std::string const path = root->pathOf(file);
+    std::string name = path.substr(path.rfind('/') + 1);
+    if (name.empty() || name == "." || name == "..")
+        throw ChangeEventsSubscriptionException(file);
+    StorageIRI const folder = file.getParent();
+    notifier_->subscribe({.root = root,
+                          .path = root->pathOf(folder),
+                          .folder = folder,
+                          .name = std::move(name),
+                          .subject = file,
+                          .callback = callback,
+                          .kinds = kinds});
+}
+
+void LocalProvider::doStopPublishingEventsFor(StorageIRI const& folder) const
+{
+    notifier_->stop(nativePath(folder));
 }
 
 } // namespace foundation::storage::local

@@ -11,6 +11,7 @@
 namespace foundation::storage::local {
 
 namespace detail {
+class ChangeNotifier;
 class Root;
 struct Selection;
 struct Settings;
@@ -27,7 +28,9 @@ struct Settings;
 /// Settings: `durability` and `root`; see the README. `configure` throws `std::invalid_argument` for what it does not
 /// understand, and changes nothing then. What is open keeps the settings that it was opened with.
 /// Threads: any number at once, with `configure` too. A stream or listing belongs to one thread at a time.
-/// Cost: holds nothing but what its streams and listings hold, a descriptor each.
+/// Change events come in a thread of the provider; see the README for what callbacks may do.
+/// Cost: holds nothing but what its streams and listings hold, a descriptor each; with subscriptions to change events a
+/// thread and two descriptors.
 class FOUNDATION_API LocalProvider : public provider::IConfigurableProvider
 {
 public:
@@ -36,6 +39,7 @@ public:
 
 protected:
     void doConfigure(boost::property_tree::ptree tree) override;
+    void doShutdown() override;
 
     void doCreateFile(provider::StorageIRI const& iri) const override;
     void doCreateFolder(provider::StorageIRI const& iri) const override;
@@ -79,6 +83,12 @@ protected:
     Listing doListFilesNamesOnly(provider::StorageIRI const& folder) const override;
     Listing doListFilesNamesOnlyWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
 
+    void doPublishFolderEventsFor(provider::StorageIRI const& folder, provider::ChangeEventCallback const& callback,
+                                  EventKinds const& kinds) const override;
+    void doPublishFileEventsFor(provider::StorageIRI const& file, provider::ChangeEventCallback const& callback,
+                                EventKinds const& kinds) const override;
+    void doStopPublishingEventsFor(provider::StorageIRI const& folder) const override;
+
 private:
     std::shared_ptr<detail::Settings const> settings() const;
     std::shared_ptr<detail::Root const> root() const;
@@ -86,6 +96,7 @@ private:
 
     mutable std::mutex mutex_;
     std::shared_ptr<detail::Settings const> settings_;
+    std::unique_ptr<detail::ChangeNotifier> const notifier_;
 };
 
 } // namespace foundation::storage::local

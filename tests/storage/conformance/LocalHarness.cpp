@@ -50,6 +50,8 @@ Harness localHarness()
                          .settableTimes = boost::posix_time::microseconds(1),
                          .settableWritability = true,
                          .enforcedWritability = permissionsBind,
+                         .fileEvents = true,
+                         .folderEvents = true,
                          .extendedAttributes = attributesOfEveryFile(),
                          .longestName = 255},
         .makers = {

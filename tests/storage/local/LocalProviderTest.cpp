@@ -2,7 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include <storage/provider/ChangeEventExceptions.hpp>
 #include <tests/storage/local/ReplacedSystemCalls.hpp>
 #include <tests/support/TemporaryFolder.hpp>
 #include <tests/support/failureOf.hpp>
@@ -356,7 +355,6 @@ TEST_F(LocalProviderTest, RefusesWhatItCannotDo)
     EXPECT_EQ(failureOf([&] { provider.listAllRecursive(at(u"folder")); }), refused);
     EXPECT_EQ(failureOf([&] { provider.copyFileAtomic(at(u"file"), at(u"new"), ReplacementPolicy::Preserve, {}); }),
               failure(ErrorCode::UnsupportedOperation, at(u"file")));
-    EXPECT_THROW(provider.publishFolderEventsFor(at(u"folder"), {}, {}), ChangeEventsNotSupportedException);
     EXPECT_FALSE(provider.hasFeature(ExtendedFeature::RecursiveFolderRemoval));
     EXPECT_FALSE(provider.hasFeature(ExtendedFeature::AtomicFileCopy));
     EXPECT_TRUE(isThere("folder/inside"));
@@ -400,6 +398,10 @@ TEST_F(LocalProviderTest, RefusesForeignLocationsInEveryOperation)
         [&] { provider.moveFolder(at(u"folder"), iri, ReplacementPolicy::Overwrite); },
         [&] { provider.copyFile(iri, to, ReplacementPolicy::Overwrite); },
         [&] { provider.copyFile(at(u"file"), iri, ReplacementPolicy::Overwrite); },
+        [&] { provider.publishFolderEventsFor(iri, {}, {}); },
+        [&] { provider.publishFileEventsFor(iri, {}, {}); },
+        [&] { provider.stopPublishingFolderEventsFor(iri); },
+        [&] { provider.stopPublishingFileEventsFor(iri); },
     };
     for (std::size_t i = 0; i < operations.size(); ++i) {
         std::string const actual = failureOf(operations[i]);
