@@ -4,8 +4,10 @@
 #include <storage/local/detail/LocalByteStream.hpp>
 #include <storage/local/detail/LocalListing.hpp>
 #include <storage/local/detail/LocalTransaction.hpp>
+#include <storage/local/detail/RecursiveListing.hpp>
 #include <storage/local/detail/Root.hpp>
 #include <storage/local/detail/Settings.hpp>
+#include <storage/local/detail/TreeRemoval.hpp>
 #include <storage/local/detail/attributes.hpp>
 #include <storage/local/detail/changeAttributes.hpp>
 #include <storage/local/detail/errorCode.hpp>
@@ -185,6 +187,11 @@ void LocalProvider::doRemoveFolder(StorageIRI const& iri) const
         throwError(error == EEXIST ? ENOTEMPTY : error, iri);
 }
 
+void LocalProvider::doRemoveFolderRecursively(StorageIRI const& iri) const
+{
+    removeTree(*root(), iri);
+}
+
 void LocalProvider::doMoveFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
     auto const settings = this->settings();
@@ -325,6 +332,32 @@ IProvider::Listing LocalProvider::doListFilesNamesOnlyWildcards(StorageIRI const
     return list(folder, {.entries = Entries::Files, .detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
 }
 
+IProvider::Listing LocalProvider::listRecursively(StorageIRI const& folder, Selection selection) const
+{
+    return std::make_unique<RecursiveListing>(root(), folder, std::move(selection));
+}
+
+IProvider::Listing LocalProvider::doListAllRecursive(StorageIRI const& folder) const
+{
+    return listRecursively(folder, {});
+}
+
+IProvider::Listing LocalProvider::doListAllRecursiveWildcards(StorageIRI const& folder, std::u16string pattern) const
+{
+    return listRecursively(folder, {.pattern = Wildcards(pattern)});
+}
+
+IProvider::Listing LocalProvider::doListAllRecursiveNamesOnly(StorageIRI const& folder) const
+{
+    return listRecursively(folder, {.detail = Detail::NamesOnly});
+}
+
+IProvider::Listing LocalProvider::doListAllRecursiveNamesOnlyWildcards(StorageIRI const& folder,
+                                                                       std::u16string pattern) const
+{
+    return listRecursively(folder, {.detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
+}
+
 void LocalProvider::doPublishFolderEventsFor(StorageIRI const& folder, ChangeEventCallback const& callback,
                                              EventKinds const& kinds) const
 {
@@ -358,6 +391,11 @@ void LocalProvider::doPublishFileEventsFor(StorageIRI const& file, ChangeEventCa
 void LocalProvider::doStopPublishingEventsFor(StorageIRI const& folder) const
 {
     notifier_->stop(nativePath(folder));
+}
+
+bool LocalProvider::doHasFeature(ExtendedFeature const& feature) const
+{
+    return feature == ExtendedFeature::RecursiveFolderRemoval;
 }
 
 } // namespace foundation::storage::local

@@ -50,6 +50,7 @@ protected:
 
     void doRemoveFile(provider::StorageIRI const& iri) const override;
     void doRemoveFolder(provider::StorageIRI const& iri) const override;
+    void doRemoveFolderRecursively(provider::StorageIRI const& iri) const override;
     void doMoveFile(provider::StorageIRI const& from, provider::StorageIRI const& to,
                     provider::ReplacementPolicy const& policy) const override;
     void doMoveFolder(provider::StorageIRI const& from, provider::StorageIRI const& to,
@@ -82,6 +83,13 @@ protected:
     Listing doListFoldersNamesOnlyWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
     Listing doListFilesNamesOnly(provider::StorageIRI const& folder) const override;
     Listing doListFilesNamesOnlyWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
+    Listing doListAllRecursive(provider::StorageIRI const& folder) const override;
+    Listing doListAllRecursiveWildcards(provider::StorageIRI const& folder, std::u16string pattern) const override;
+    Listing doListAllRecursiveNamesOnly(provider::StorageIRI const& folder) const override;
+    Listing doListAllRecursiveNamesOnlyWildcards(provider::StorageIRI const& folder,
+                                                 std::u16string pattern) const override;
+
+    bool doHasFeature(provider::ExtendedFeature const& feature) const override;
 
     void doPublishFolderEventsFor(provider::StorageIRI const& folder, provider::ChangeEventCallback const& callback,
                                   EventKinds const& kinds) const override;
@@ -93,6 +101,7 @@ private:
     std::shared_ptr<detail::Settings const> settings() const;
     std::shared_ptr<detail::Root const> root() const;
     Listing list(provider::StorageIRI const& folder, detail::Selection selection) const;
+    Listing listRecursively(provider::StorageIRI const& folder, detail::Selection selection) const;
 
     mutable std::mutex mutex_;
     std::shared_ptr<detail::Settings const> settings_;

@@ -1,6 +1,7 @@
 #include <storage/local/detail/EntryMaker.hpp>
 
 #include <fl/filesystem/native_name.hpp>
+#include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/fileSystem.hpp>
 
 #include <cerrno>
@@ -9,6 +10,7 @@
 namespace foundation::storage::local::detail {
 
 using provider::FolderEntry;
+using provider::StorageIRI;
 
 namespace {
 
@@ -32,6 +34,20 @@ bool leadsToFolder(ListedFolder const& folder, FoundName const& found)
 }
 
 } // namespace
+
+std::shared_ptr<FolderPath const> listedPath(std::shared_ptr<Root const> root, StorageIRI const& folder)
+{
+    std::string path = root->pathOf(folder);
+    return std::make_shared<FolderPath const>(FolderPath{std::move(root), std::move(path)});
+}
+
+FileDescriptor openListed(FolderPath const& path, StorageIRI const& folder)
+{
+    FileDescriptor opened;
+    if (int const error = path.root->open(path.path, O_RDONLY | O_DIRECTORY, opened))
+        throwError(error, folder);
+    return opened;
+}
 
 int EntryMaker::make(ListedFolder const& folder, FoundName const& found, std::optional<FolderEntry>& entry) const
 {

@@ -6,6 +6,7 @@
 #include <storage/local/detail/Selection.hpp>
 #include <storage/local/detail/attributes.hpp>
 #include <storage/provider/FolderEntry.hpp>
+#include <storage/provider/StorageIRI.hpp>
 
 #include <memory>
 #include <optional>
@@ -22,6 +23,12 @@ struct ListedFolder
     std::shared_ptr<FolderPath const> path;
     std::u16string prefix = {};
 };
+
+/// Where the folder is that is to be listed; throws what `Root::pathOf` throws.
+std::shared_ptr<FolderPath const> listedPath(std::shared_ptr<Root const> root, provider::StorageIRI const& folder);
+
+/// Opens the folder that is to be listed; throws `Exception` with its location.
+FileDescriptor openListed(FolderPath const& path, provider::StorageIRI const& folder);
 
 /// Makes the entries of a listing of the names that are found in folders.
 ///

@@ -2,25 +2,9 @@
 
 #include <foundation/export.hpp>
 #include <storage/local/detail/FileDescriptor.hpp>
-
-#include <cstddef>
-#include <dirent.h>
-#include <memory>
-#include <string_view>
+#include <storage/local/detail/NameBuffer.hpp>
 
 namespace foundation::storage::local::detail {
-
-/// A name in a folder, and what the folder tells of it.
-struct FoundName
-{
-    /// Ends with a NUL behind; lives as long as nothing more is read.
-    std::string_view name;
-    unsigned char type;
-
-    /// A link may lead anywhere, and not every file system tells.
-    bool isDecided() const { return type != DT_LNK && type != DT_UNKNOWN; }
-    bool isFolder() const { return type == DT_DIR; }
-};
 
 /// Reads the names in a folder, a buffer at a time, in the order of the file system, without "." and "..".
 ///
@@ -41,12 +25,8 @@ public:
     [[nodiscard]] int restart();
 
 private:
-    int refill();
-
     FileDescriptor folder_;
-    std::unique_ptr<char[]> buffer_;
-    std::size_t position_ = 0;
-    std::size_t end_ = 0;
+    NameBuffer names_;
 };
 
 } // namespace foundation::storage::local::detail

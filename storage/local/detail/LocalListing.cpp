@@ -9,31 +9,13 @@ namespace foundation::storage::local::detail {
 
 using provider::StorageIRI;
 
-namespace {
-
-std::shared_ptr<FolderPath const> pathOf(std::shared_ptr<Root const> root, StorageIRI const& iri)
-{
-    std::string path = root->pathOf(iri);
-    return std::make_shared<FolderPath const>(FolderPath{std::move(root), std::move(path)});
-}
-
-FileDescriptor openFolder(FolderPath const& path, StorageIRI const& iri)
-{
-    FileDescriptor folder;
-    if (int const error = path.root->open(path.path, O_RDONLY | O_DIRECTORY, folder))
-        throwError(error, iri);
-    return folder;
-}
-
-} // namespace
-
 LocalListing::LocalListing(std::shared_ptr<Root const> root, StorageIRI const& folder, Selection selection)
-    : LocalListing(pathOf(std::move(root), folder), folder, std::move(selection))
+    : LocalListing(listedPath(std::move(root), folder), folder, std::move(selection))
 {}
 
 LocalListing::LocalListing(std::shared_ptr<FolderPath const> path, StorageIRI const& folder, Selection selection)
     : iri_(folder),
-      reader_(openFolder(*path, folder)),
+      reader_(openListed(*path, folder)),
       folder_{.descriptor = reader_.folder().get(), .path = std::move(path)},
       maker_(std::move(selection))
 {

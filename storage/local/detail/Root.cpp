@@ -4,6 +4,7 @@
 #include <storage/local/detail/nativePath.hpp>
 
 #include <algorithm>
+#include <cerrno>
 #include <climits>
 #include <stdexcept>
 #include <system_error>
@@ -153,6 +154,18 @@ int Root::locateConfined(std::string path, Located& entry) const
     entry.owned_ = std::move(folder);
     entry.folder_ = entry.owned_.get();
     return 0;
+}
+
+int Root::openParent(std::string const& path, FileDescriptor& parent, std::string& name) const
+{
+    bool const isRoot = path.find_first_not_of('/', path_.size()) == std::string::npos;
+    if (isRoot)
+        return EBUSY;
+    std::size_t const slash = path.rfind('/');
+    name = path.substr(slash + 1);
+    if (name == "." || name == "..")
+        return EINVAL;
+    return open(path.substr(0, std::max<std::size_t>(slash, 1)), O_PATH | O_DIRECTORY, parent);
 }
 
 int Root::getStatus(std::string const& path, Links links, Status& status) const

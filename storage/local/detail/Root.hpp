@@ -66,6 +66,10 @@ public:
     /// Finds the folder that holds the last name of a path.
     [[nodiscard]] int locate(std::string const& path, Located& entry) const;
 
+    /// Opens the folder that holds the last name of a path, so that what happens there is done to one folder, whatever
+    /// is renamed meanwhile. `EBUSY` for the root itself, `EINVAL` where the last name is "." or "..".
+    [[nodiscard]] int openParent(std::string const& path, FileDescriptor& parent, std::string& name) const;
+
     /// Whether a folder stands at a path, perhaps by a link.
     bool leadsToFolder(std::string const& path) const;
 

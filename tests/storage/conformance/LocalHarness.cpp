@@ -45,7 +45,9 @@ Harness localHarness()
     bool const permissionsBind = ::geteuid() != 0;
     return {
         .makePlace = makePlace,
-        .capabilities = {.copyOntoItself = CopyOntoItself::ChangesNothing,
+        .capabilities = {.recursiveRemoval = true,
+                         .recursiveListing = true,
+                         .copyOntoItself = CopyOntoItself::ChangesNothing,
                          .patterns = Patterns::Globs,
                          .settableTimes = boost::posix_time::microseconds(1),
                          .settableWritability = true,

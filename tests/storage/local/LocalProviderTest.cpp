@@ -350,12 +350,8 @@ TEST_F(LocalProviderTest, CommitsOverNoFolder)
 
 TEST_F(LocalProviderTest, RefusesWhatItCannotDo)
 {
-    auto const refused = failure(ErrorCode::UnsupportedOperation, at(u"folder"));
-    EXPECT_EQ(failureOf([&] { provider.removeFolderRecursively(at(u"folder")); }), refused);
-    EXPECT_EQ(failureOf([&] { provider.listAllRecursive(at(u"folder")); }), refused);
     EXPECT_EQ(failureOf([&] { provider.copyFileAtomic(at(u"file"), at(u"new"), ReplacementPolicy::Preserve, {}); }),
               failure(ErrorCode::UnsupportedOperation, at(u"file")));
-    EXPECT_FALSE(provider.hasFeature(ExtendedFeature::RecursiveFolderRemoval));
     EXPECT_FALSE(provider.hasFeature(ExtendedFeature::AtomicFileCopy));
     EXPECT_TRUE(isThere("folder/inside"));
 }
