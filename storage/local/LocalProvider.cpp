@@ -10,6 +10,7 @@
 #include <storage/local/detail/TreeRemoval.hpp>
 #include <storage/local/detail/attributes.hpp>
 #include <storage/local/detail/changeAttributes.hpp>
+#include <storage/local/detail/copyFile.hpp>
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/extendedAttributes.hpp>
 #include <storage/local/detail/fileSystem.hpp>
@@ -56,15 +57,6 @@ ExistenceTypeExtended typeOfLink(Root const& root, std::string const& path, Stor
     if (!target)
         return ExistenceTypeExtended::BrokenSymlink;
     return isFolder(*target) ? ExistenceTypeExtended::SymlinkToFolder : ExistenceTypeExtended::SymlinkToFile;
-}
-
-bool isSameContent(Root const& root, StorageIRI const& left, StorageIRI const& right)
-{
-    Status leftStatus;
-    Status rightStatus;
-    return root.getStatus(root.pathOf(right), Links::Follow, rightStatus) == 0 &&
-           root.getStatus(root.pathOf(left), Links::Follow, leftStatus) == 0 && isSameFile(leftStatus, rightStatus) &&
-           S_ISREG(leftStatus.stx_mode);
 }
 
 Located locate(Root const& root, std::string const& path, StorageIRI const& iri)
@@ -208,9 +200,13 @@ void LocalProvider::doMoveFolder(StorageIRI const& from, StorageIRI const& to, R
 
 void LocalProvider::doCopyFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
-    if (replaces(policy) && isSameContent(*root(), from, to))
-        return;
-    IProvider::doCopyFile(from, to, policy);
+    detail::copyFile(*settings(), from, to, policy);
+}
+
+TransactionStatus LocalProvider::doCopyFileAtomic(StorageIRI const& from, StorageIRI const& to,
+                                                  ReplacementPolicy const& policy, Interrupt const& interrupt) const
+{
+    return detail::copyFileAtomic(*settings(), from, to, policy, interrupt);
 }
 
 FileAttributes LocalProvider::doGetFileAttributes(StorageIRI const& iri) const
@@ -395,7 +391,7 @@ void LocalProvider::doStopPublishingEventsFor(StorageIRI const& folder) const
 
 bool LocalProvider::doHasFeature(ExtendedFeature const& feature) const
 {
-    return feature == ExtendedFeature::RecursiveFolderRemoval;
+    return feature == ExtendedFeature::RecursiveFolderRemoval || feature == ExtendedFeature::AtomicFileCopy;
 }
 
 } // namespace foundation::storage::local

@@ -57,6 +57,9 @@ protected:
                       provider::ReplacementPolicy const& policy) const override;
     void doCopyFile(provider::StorageIRI const& from, provider::StorageIRI const& to,
                     provider::ReplacementPolicy const& policy) const override;
+    provider::TransactionStatus doCopyFileAtomic(provider::StorageIRI const& from, provider::StorageIRI const& to,
+                                                 provider::ReplacementPolicy const& policy,
+                                                 Interrupt const& interrupt) const override;
 
     provider::FileAttributes doGetFileAttributes(provider::StorageIRI const& iri) const override;
     provider::FolderAttributes doGetFolderAttributes(provider::StorageIRI const& iri) const override;

@@ -3,6 +3,7 @@
 #include <storage/local/detail/SystemCalls.hpp>
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/fileSystem.hpp>
+#include <storage/local/detail/openRegularFile.hpp>
 
 #include <cerrno>
 #include <cstdio>
@@ -14,38 +15,6 @@ namespace foundation::storage::local::detail {
 using namespace provider;
 
 namespace {
-
-/// Without `O_NONBLOCK` opening a pipe would wait for somebody at its other end. It means nothing to a file.
-constexpr int commonFlags = O_NOCTTY | O_NONBLOCK;
-
-[[noreturn]] void throwCannotOpen(int error, StorageIRI const& iri)
-{
-    if (error == EISDIR)
-        throwError(ErrorCode::ResourceNotFound, iri);
-    if (error == ENXIO || error == ENODEV)
-        throwError(ErrorCode::UnsupportedOperation, iri);
-    throwError(error, iri);
-}
-
-void requireRegularFile(FileDescriptor const& file, StorageIRI const& iri)
-{
-    Status status;
-    if (int const error = getStatus(file, status))
-        throwError(error, iri);
-    if (isFolder(status))
-        throwError(ErrorCode::ResourceNotFound, iri);
-    if (!S_ISREG(status.stx_mode))
-        throwError(ErrorCode::UnsupportedOperation, iri);
-}
-
-FileDescriptor openContent(Root const& root, std::string const& path, int flags, StorageIRI const& iri)
-{
-    FileDescriptor file;
-    if (int const error = root.open(path, flags | commonFlags, file))
-        throwCannotOpen(error, iri);
-    requireRegularFile(file, iri);
-    return file;
-}
 
 int toOrigin(std::ios_base::seekdir direction)
 {
@@ -141,7 +110,7 @@ int openFlags(ByteStreamOpenOptions const& options)
 std::unique_ptr<ByteStream> openForReading(Root const& root, StorageIRI const& iri)
 {
     std::string path = root.pathOf(iri);
-    FileDescriptor file = openContent(root, path, O_RDONLY, iri);
+    FileDescriptor file = openRegularFile(root, path, O_RDONLY, iri).file;
     systemCalls().fadvise(file.get(), 0, 0, POSIX_FADV_SEQUENTIAL);
     return std::make_unique<LocalByteStream>(std::move(file), std::move(path));
 }
@@ -150,7 +119,7 @@ std::unique_ptr<ByteStream> openForWriting(Root const& root, StorageIRI const& i
                                            ByteStreamOpenOptions const& options)
 {
     std::string path = root.pathOf(iri);
-    FileDescriptor file = openContent(root, path, openFlags(options), iri);
+    FileDescriptor file = openRegularFile(root, path, openFlags(options), iri).file;
     return std::make_unique<LocalByteStream>(std::move(file), std::move(path));
 }
 

@@ -47,6 +47,7 @@ Harness localHarness()
         .makePlace = makePlace,
         .capabilities = {.recursiveRemoval = true,
                          .recursiveListing = true,
+                         .atomicCopy = true,
                          .copyOntoItself = CopyOntoItself::ChangesNothing,
                          .patterns = Patterns::Globs,
                          .settableTimes = boost::posix_time::microseconds(1),

@@ -348,14 +348,6 @@ TEST_F(LocalProviderTest, CommitsOverNoFolder)
     EXPECT_TRUE(isThere("folder/inside"));
 }
 
-TEST_F(LocalProviderTest, RefusesWhatItCannotDo)
-{
-    EXPECT_EQ(failureOf([&] { provider.copyFileAtomic(at(u"file"), at(u"new"), ReplacementPolicy::Preserve, {}); }),
-              failure(ErrorCode::UnsupportedOperation, at(u"file")));
-    EXPECT_FALSE(provider.hasFeature(ExtendedFeature::AtomicFileCopy));
-    EXPECT_TRUE(isThere("folder/inside"));
-}
-
 TEST_F(LocalProviderTest, TellsNamesApartThatDifferInCase)
 {
     FilenameSensitivity const sensitivity = provider.getFilenameSensitivity(folder.iri());

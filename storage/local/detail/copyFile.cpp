@@ -1,0 +1,125 @@
+#include <storage/local/detail/copyFile.hpp>
+
+#include <storage/local/detail/ScratchFile.hpp>
+#include <storage/local/detail/copyContent.hpp>
+#include <storage/local/detail/errorCode.hpp>
+#include <storage/local/detail/move.hpp>
+#include <storage/local/detail/openRegularFile.hpp>
+#include <storage/provider/Exception.hpp>
+
+#include <optional>
+
+namespace foundation::storage::local::detail {
+
+using provider::ErrorCode;
+using provider::Exception;
+using provider::IProvider;
+using provider::ReplacementPolicy;
+using provider::StorageIRI;
+using provider::TransactionStatus;
+
+namespace {
+
+constexpr mode_t permissionBits = 0777;
+
+/// To copy this much in vain, because the target turns out to be taken, costs less than to look at each target before.
+constexpr std::uint64_t lookSize = 16384;
+
+/// Both ends of a copy, as the client named them and as the system calls do.
+struct Copy
+{
+    Root const& root;
+    StorageIRI const& from;
+    StorageIRI const& to;
+    ReplacementPolicy policy;
+    std::string fromPath = root.pathOf(from);
+    std::string toPath = root.pathOf(to);
+};
+
+/// What stands at the target and may be replaced, or what a link there leads to; nothing where nothing is.
+std::optional<Status> requireReplaceable(Copy const& copy)
+{
+    Status status;
+    int const error = copy.root.getStatus(copy.toPath, Links::Follow, status);
+    if (meansMissing(error))
+        return std::nullopt;
+    if (error != 0)
+        throwError(error, copy.to);
+    if (isFolder(status) || !replaces(copy.policy))
+        throwError(ErrorCode::ResourceAlreadyExists, copy.to);
+    return status;
+}
+
+OpenedFile openSource(Copy const& copy)
+{
+    return openRegularFile(copy.root, copy.fromPath, O_RDONLY, copy.from);
+}
+
+/// Looks at the target first where the source cannot be opened.
+OpenedFile openSourceBeforeLooking(Copy const& copy)
+{
+    try {
+        return openSource(copy);
+    } catch (Exception const&) {
+        requireReplaceable(copy);
+        throw;
+    }
+}
+
+mode_t modeOfCopy(OpenedFile const& source)
+{
+    return source.status.stx_mode & permissionBits;
+}
+
+/// Is not truncated as it is opened: ext4 writes a file that was to the disk when it is closed.
+OpenedFile openTarget(Copy const& copy, OpenedFile const& source)
+{
+    OpenedFile target = openRegularFile(copy.root, copy.toPath, O_WRONLY | O_CREAT, copy.to, modeOfCopy(source));
+    if (target.status.stx_size == 0 || isSameFile(source.status, target.status))
+        return target;
+    if (int const error = errorOf([&] { return systemCalls().ftruncate(target.file.get(), 0); }))
+        throwError(error, copy.to);
+    return target;
+}
+
+/// What a replacing policy finds.
+bool leadsToSource(Copy const& copy, OpenedFile const& source)
+{
+    std::optional<Status> const target = requireReplaceable(copy);
+    return target && isSameFile(source.status, *target);
+}
+
+} // namespace
+
+void copyFile(Settings const& settings, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
+{
+    Copy const copy{settings.root, from, to, policy};
+    requireReplaceable(copy);
+    OpenedFile const source = openSource(copy);
+    OpenedFile target = openTarget(copy, source);
+    if (isSameFile(source.status, target.status))
+        return;
+    CopyResult const result = copyContent(source.file, source.status, target.file, {});
+    if (int const error = result.error != 0 ? result.error : target.file.close())
+        throwError(error, from);
+}
+
+TransactionStatus copyFileAtomic(Settings const& settings, StorageIRI const& from, StorageIRI const& to,
+                                 ReplacementPolicy policy, IProvider::Interrupt const& interrupt)
+{
+    Copy const copy{settings.root, from, to, policy};
+    OpenedFile const source = openSourceBeforeLooking(copy);
+    bool const looks = replaces(policy) || source.status.stx_size > lookSize;
+    if (looks && leadsToSource(copy, source))
+        return TransactionStatus::Completed;
+    ScratchFile scratch(settings.root, to, settings.durability, O_WRONLY, modeOfCopy(source));
+    CopyResult const result = copyContent(source.file, source.status, scratch.file(), interrupt);
+    if (result.outcome == CopyOutcome::Aborted)
+        return TransactionStatus::Aborted;
+    if (result.error != 0)
+        throwError(result.error, result.outcome == CopyOutcome::SourceFailed ? from : to);
+    scratch.commit(policy);
+    return TransactionStatus::Completed;
+}
+
+} // namespace foundation::storage::local::detail
