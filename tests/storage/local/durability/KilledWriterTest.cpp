@@ -3,12 +3,14 @@
 #include <gtest/gtest.h>
 
 #include <storage/local/detail/scratchName.hpp>
+#include <tests/storage/local/durability/SharedMemory.hpp>
 #include <tests/storage/local/durability/WrittenContent.hpp>
 #include <tests/support/TemporaryFolder.hpp>
 
 #include <boost/property_tree/ptree.hpp>
 
 #include <algorithm>
+#include <atomic>
 #include <chrono>
 #include <csignal>
 #include <cstdint>
@@ -16,7 +18,6 @@
 #include <random>
 #include <stdexcept>
 #include <string>
-#include <sys/mman.h>
 #include <sys/wait.h>
 #include <time.h>
 #include <unistd.h>
@@ -28,36 +29,21 @@ namespace fs = std::filesystem;
 using namespace provider;
 using tests::support::madeContent;
 using tests::support::numberOfContent;
+using tests::support::SharedMemory;
 using tests::support::TemporaryFolder;
 
 constexpr int kills = 1000;
 
-/// The number of the last content whose commit returned, told by the writer to those who outlive it.
-class Acknowledged
-{
-public:
-    Acknowledged()
-        : number_(static_cast<std::uint64_t volatile*>(
-              ::mmap(nullptr, sizeof(std::uint64_t), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0)))
-    {}
-    ~Acknowledged() { ::munmap(const_cast<std::uint64_t*>(number_), sizeof(std::uint64_t)); }
-    Acknowledged(Acknowledged const&) = delete;
-    Acknowledged& operator=(Acknowledged const&) = delete;
+/// The number of the last content whose commit returned.
+using Acknowledged = std::atomic<std::uint64_t>;
 
-    std::uint64_t get() const { return *number_; }
-    void set(std::uint64_t number) const { *number_ = number; }
-
-private:
-    std::uint64_t volatile* number_;
-};
-
-[[noreturn]] void writeForEver(StorageIRI const& file, Acknowledged const& acknowledged)
+[[noreturn]] void writeForEver(StorageIRI const& file, Acknowledged& acknowledged)
 {
     LocalProvider provider;
     boost::property_tree::ptree settings;
     settings.put("durability", "none"); // What a process leaves behind is not a matter of the disk.
     provider.configure(settings);
-    for (std::uint64_t number = acknowledged.get() + 1;; ++number) {
+    for (std::uint64_t number = acknowledged.load() + 1;; ++number) {
         std::string const content = madeContent(number);
         auto const stream = provider.openTransactionalStream(file, {});
         for (std::size_t written = 0; written < content.size();) {
@@ -65,12 +51,12 @@ private:
             written += static_cast<std::size_t>(stream->write(content.data() + written, count));
         }
         stream->close(StreamClosePolicy::Commit);
-        acknowledged.set(number);
+        acknowledged = number;
     }
 }
 
 /// Lets a writer run for a moment, and kills it.
-void killAWriter(StorageIRI const& file, Acknowledged const& acknowledged, std::chrono::microseconds moment)
+void killAWriter(StorageIRI const& file, Acknowledged& acknowledged, std::chrono::microseconds moment)
 {
     pid_t const writer = ::fork();
     if (writer == 0)
@@ -89,15 +75,16 @@ TEST(KilledWriter, LeavesOldOrNewContentWholeAndNothingElseButScratchFiles)
 {
     TemporaryFolder const folder;
     folder.write("file", madeContent(0));
-    Acknowledged const acknowledged;
+    SharedMemory<Acknowledged> const shared;
+    Acknowledged& acknowledged = *shared;
     std::minstd_rand random(20240229);
     int interrupted = 0;
     for (int i = 0; i < kills; ++i) {
         killAWriter(folder.iri(u"file"), acknowledged, std::chrono::microseconds(random() % 3000));
         std::uint64_t const found = numberOfContent(folder.read("file"));
-        ASSERT_TRUE(found == acknowledged.get() || found == acknowledged.get() + 1)
-            << "found " << found << ", acknowledged " << acknowledged.get();
-        acknowledged.set(found);
+        ASSERT_TRUE(found == acknowledged.load() || found == acknowledged.load() + 1)
+            << "found " << found << ", acknowledged " << acknowledged.load();
+        acknowledged = found;
         for (fs::directory_entry const& entry : fs::directory_iterator(folder.path())) {
             std::string const name = entry.path().filename();
             if (name == "file")
@@ -107,7 +94,7 @@ TEST(KilledWriter, LeavesOldOrNewContentWholeAndNothingElseButScratchFiles)
             fs::remove(entry.path());
         }
     }
-    EXPECT_GT(acknowledged.get(), 0u) << "no writer got to the end of a write";
+    EXPECT_GT(acknowledged.load(), 0u) << "no writer got to the end of a write";
     EXPECT_GT(interrupted, kills / 20) << "the writers were not killed while they wrote";
 }
 

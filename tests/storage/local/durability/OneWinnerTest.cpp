@@ -1,0 +1,199 @@
+#include <storage/local/LocalProvider.hpp>
+
+#include <gtest/gtest.h>
+
+#include <storage/local/detail/ScratchFile.hpp>
+#include <storage/provider/Exception.hpp>
+#include <tests/storage/local/durability/SharedMemory.hpp>
+#include <tests/support/TemporaryFolder.hpp>
+
+#include <boost/property_tree/ptree.hpp>
+
+#include <algorithm>
+#include <array>
+#include <csignal>
+#include <cstdlib>
+#include <filesystem>
+#include <functional>
+#include <pthread.h>
+#include <stdexcept>
+#include <string>
+#include <sys/prctl.h>
+#include <sys/wait.h>
+#include <unistd.h>
+#include <vector>
+
+namespace foundation::storage::local {
+namespace {
+
+namespace fs = std::filesystem;
+using namespace provider;
+using tests::support::SharedMemory;
+using tests::support::TemporaryFolder;
+
+constexpr unsigned processCount = 64;
+constexpr int rounds = 1000;
+
+enum class Outcome
+{
+    Won,
+    Lost,
+    Failed
+};
+
+/// Where processes meet: before each round, and after it.
+struct Meeting
+{
+    Meeting()
+    {
+        pthread_barrierattr_t attributes;
+        pthread_barrierattr_init(&attributes);
+        pthread_barrierattr_setpshared(&attributes, PTHREAD_PROCESS_SHARED);
+        pthread_barrier_init(&barrier, &attributes, processCount + 1);
+    }
+
+    void wait() { pthread_barrier_wait(&barrier); }
+
+    pthread_barrier_t barrier;
+    std::array<Outcome, processCount> outcomes{};
+};
+
+/// What a process does in a round to get the name.
+using Attempt = std::function<void(unsigned process, int round)>;
+
+Outcome outcomeOf(Attempt const& attempt, StorageIRI const& target, unsigned process, int round)
+{
+    try {
+        attempt(process, round);
+        return Outcome::Won;
+    } catch (Exception const& error) {
+        bool const isTold = error.getErrorCode() == ErrorCode::ResourceAlreadyExists && error.getStorageIRI() == target;
+        return isTold ? Outcome::Lost : Outcome::Failed;
+    } catch (std::exception const&) {
+        return Outcome::Failed;
+    }
+}
+
+[[noreturn]] void compete(Meeting& meeting, Attempt const& attempt, StorageIRI const& target, unsigned process)
+{
+    ::prctl(PR_SET_PDEATHSIG, SIGKILL);
+    for (int round = 0; round < rounds; ++round) {
+        meeting.wait();
+        meeting.outcomes.at(process) = outcomeOf(attempt, target, process, round);
+        meeting.wait();
+    }
+    ::_exit(EXIT_SUCCESS);
+}
+
+class OneWinnerAmongProcesses : public testing::Test
+{
+protected:
+    OneWinnerAmongProcesses()
+    {
+        boost::property_tree::ptree settings;
+        settings.put("durability", "none"); // Who wins is not a matter of the disk.
+        provider.configure(settings);
+        for (unsigned process = 0; process < processCount; ++process)
+            folder.write("source" + std::to_string(process), std::to_string(process));
+    }
+
+    static std::u16string sourceOf(unsigned process)
+    {
+        std::string const name = "source" + std::to_string(process);
+        return std::u16string(name.begin(), name.end());
+    }
+
+    static ReplacementPolicy policyOf(unsigned process)
+    {
+        return process % 2 == 0 ? ReplacementPolicy::Preserve : ReplacementPolicy::NoClobber;
+    }
+
+    void create() const { provider.createFile(target); }
+
+    void move(unsigned process) const { provider.moveFile(folder.iri(sourceOf(process)), target, policyOf(process)); }
+
+    void publish(unsigned process) const
+    {
+        detail::ScratchFile(root, target, detail::Durability::None).commit(policyOf(process));
+    }
+
+    /// Lets all processes attempt to get the name, round after round, and looks at each outcome.
+    void run(Attempt const& attempt)
+    {
+        std::vector<pid_t> processes;
+        for (unsigned process = 0; process < processCount; ++process) {
+            processes.push_back(::fork());
+            if (processes.back() == 0)
+                compete(*meeting, attempt, target, process);
+            if (processes.back() == -1)
+                throw std::runtime_error("not enough processes");
+        }
+        for (int round = 0; round < rounds; ++round) {
+            meeting->wait();
+            meeting->wait();
+            judge(round);
+        }
+        for (pid_t const process : processes) {
+            int status = 0;
+            EXPECT_EQ(::waitpid(process, &status, 0), process);
+            EXPECT_EQ(status, 0);
+        }
+        EXPECT_EQ(badRounds, 0);
+    }
+
+    /// The next round starts as this one did.
+    void judge(int round)
+    {
+        auto const& outcomes = meeting->outcomes;
+        auto const winner = std::find(outcomes.begin(), outcomes.end(), Outcome::Won);
+        long const losers = std::count(outcomes.begin(), outcomes.end(), Outcome::Lost);
+        bool const isGood = winner != outcomes.end() && losers == processCount - 1 && fs::exists(folder / "target");
+        if (!isGood && ++badRounds == 1)
+            ADD_FAILURE() << "round " << round << ": " << std::count(outcomes.begin(), outcomes.end(), Outcome::Won)
+                          << " winners, " << losers << " losers";
+        fs::remove(folder / "target");
+        auto const process = std::to_string(winner - outcomes.begin());
+        if (winner != outcomes.end() && !fs::exists(folder / ("source" + process)))
+            folder.write("source" + process, process);
+    }
+
+    TemporaryFolder const folder;
+    detail::Root const root;
+    LocalProvider provider;
+    StorageIRI const target = folder.iri(u"target");
+    SharedMemory<Meeting> const meeting;
+    int badRounds = 0;
+};
+
+TEST_F(OneWinnerAmongProcesses, CreatesAFile)
+{
+    run([this](unsigned, int) { create(); });
+}
+
+TEST_F(OneWinnerAmongProcesses, MovesItsFileThere)
+{
+    run([this](unsigned process, int) { move(process); });
+}
+
+TEST_F(OneWinnerAmongProcesses, PutsItsScratchFileThere)
+{
+    run([this](unsigned process, int) { publish(process); });
+    EXPECT_EQ(std::distance(fs::directory_iterator(folder.path()), {}), processCount) << "scratch files are left";
+}
+
+TEST_F(OneWinnerAmongProcesses, WinsAgainstOthersThatDoOtherwise)
+{
+    run([this](unsigned process, int round) {
+        switch ((process + static_cast<unsigned>(round)) % 3) {
+        case 0:
+            return create();
+        case 1:
+            return move(process);
+        default:
+            return publish(process);
+        }
+    });
+}
+
+} // namespace
+} // namespace foundation::storage::local
