@@ -1,0 +1,135 @@
+#include <storage/local/scratchFiles.hpp>
+
+#include <gtest/gtest.h>
+
+#include <storage/local/LocalProvider.hpp>
+#include <tests/support/TemporaryFolder.hpp>
+#include <tests/support/failureOf.hpp>
+
+#include <chrono>
+#include <csignal>
+#include <fcntl.h>
+#include <filesystem>
+#include <string>
+#include <sys/mman.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace foundation::storage::local {
+namespace {
+
+namespace fs = std::filesystem;
+using namespace provider;
+using namespace std::chrono_literals;
+using tests::support::failure;
+using tests::support::failureOf;
+using tests::support::TemporaryFolder;
+
+class ScratchFiles : public testing::Test
+{
+protected:
+    ScratchFiles() { folder.write(name, "content"); }
+
+    StorageIRI iri() const { return folder.iri(std::u16string(name.begin(), name.end())); }
+
+    void makeOld(std::chrono::hours age) const
+    {
+        fs::last_write_time(folder / name, fs::file_time_type::clock::now() - age);
+    }
+
+    std::string const name = "7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak";
+    TemporaryFolder const folder;
+};
+
+TEST_F(ScratchFiles, AreRemovedWhenNobodyNeedsThem)
+{
+    makeOld(2h);
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 1h), ScratchFileState::Abandoned);
+    EXPECT_FALSE(fs::exists(folder / name));
+}
+
+TEST_F(ScratchFiles, AreOnlyLookedAtWhenExamined)
+{
+    EXPECT_EQ(examineScratchFile(iri(), 0s), ScratchFileState::Abandoned);
+    EXPECT_EQ(folder.read(name), "content");
+}
+
+TEST_F(ScratchFiles, StayWhileTheyAreYoung)
+{
+    makeOld(2h);
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 3h), ScratchFileState::Recent);
+    EXPECT_TRUE(fs::exists(folder / name));
+}
+
+TEST_F(ScratchFiles, StayWhileTheyAreOpenInWhicheverWay)
+{
+    for (int const flags : {O_RDONLY, O_WRONLY, O_RDWR}) {
+        int const descriptor = ::open((folder / name).c_str(), flags | O_CLOEXEC);
+        EXPECT_EQ(removeAbandonedScratchFile(iri(), 0s), ScratchFileState::InUse);
+        ::close(descriptor);
+    }
+    EXPECT_EQ(examineScratchFile(iri(), 0s), ScratchFileState::Abandoned);
+}
+
+TEST_F(ScratchFiles, StayWhileTheyAreMapped)
+{
+    int const descriptor = ::open((folder / name).c_str(), O_RDWR | O_CLOEXEC);
+    void* const memory = ::mmap(nullptr, 7, PROT_READ | PROT_WRITE, MAP_SHARED, descriptor, 0);
+    ::close(descriptor);
+    ASSERT_NE(memory, MAP_FAILED);
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 0s), ScratchFileState::InUse);
+    ::munmap(memory, 7);
+}
+
+TEST_F(ScratchFiles, StayWhileAnotherProcessHasThemOpen)
+{
+    int pipe[2];
+    ASSERT_EQ(::pipe(pipe), 0);
+    pid_t const child = ::fork();
+    if (child == 0) {
+        bool const isOpen = ::open((folder / name).c_str(), O_RDONLY | O_CLOEXEC) != -1;
+        ::_exit(::write(pipe[1], &isOpen, 1) == 1 && ::pause() == 0);
+    }
+    bool isOpen = false;
+    ASSERT_EQ(::read(pipe[0], &isOpen, 1), 1);
+    EXPECT_TRUE(isOpen);
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 0s), ScratchFileState::InUse);
+    ::kill(child, SIGKILL);
+    ::waitpid(child, nullptr, 0);
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 0s), ScratchFileState::Abandoned);
+    ::close(pipe[0]);
+    ::close(pipe[1]);
+}
+
+/// Up to the rename, and under every durability.
+TEST_F(ScratchFiles, StayWhileATransactionIsOpen)
+{
+    TemporaryFolder const other;
+    LocalProvider const provider;
+    auto const stream = provider.openTransactionalStream(other.iri(u"file"), {});
+    std::u16string const scratch = provider.listAll(other.iri())->entry().getName();
+    EXPECT_EQ(removeAbandonedScratchFile(other.iri(scratch), 0s), ScratchFileState::InUse);
+    stream->byteStream()->close();
+    EXPECT_EQ(removeAbandonedScratchFile(other.iri(scratch), 0s), ScratchFileState::InUse);
+    stream->close(StreamClosePolicy::Commit);
+    EXPECT_TRUE(fs::exists(other / "file"));
+}
+
+TEST_F(ScratchFiles, AreFilesOfTheirFormOnly)
+{
+    folder.write("file", "");
+    EXPECT_EQ(failureOf([&] { removeAbandonedScratchFile(folder.iri(u"file"), 0s); }),
+              failure(ErrorCode::InvalidLocation, folder.iri(u"file")));
+    fs::remove(folder / name);
+    auto const missing = failure(ErrorCode::ResourceNotFound, iri());
+    EXPECT_EQ(failureOf([&] { removeAbandonedScratchFile(iri(), 0s); }), missing);
+    fs::create_symlink("file", folder / name);
+    EXPECT_EQ(failureOf([&] { removeAbandonedScratchFile(iri(), 0s); }), missing);
+    fs::remove(folder / name);
+    fs::create_directory(folder / name);
+    EXPECT_EQ(failureOf([&] { removeAbandonedScratchFile(iri(), 0s); }), missing);
+    EXPECT_TRUE(fs::exists(folder / name));
+}
+
+} // namespace
+} // namespace foundation::storage::local
