@@ -60,6 +60,10 @@ struct Capabilities
     /// Whether "." and ".." on a path mean what they mean to POSIX; else they name nothing.
     bool resolvesDots = true;
 
+    /// Whether the topmost location of the store belongs to what the provider serves. Where that is only what lies
+    /// beneath some folder, the top is refused with `PermissionDenied`.
+    bool servesTop = true;
+
     bool caseSensitive = true;
     bool casePreserving = true;
 

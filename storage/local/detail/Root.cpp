@@ -158,8 +158,7 @@ int Root::locateConfined(std::string path, Located& entry) const
 
 int Root::openParent(std::string const& path, FileDescriptor& parent, std::string& name) const
 {
-    bool const isRoot = path.find_first_not_of('/', path_.size()) == std::string::npos;
-    if (isRoot)
+    if (isTop(path))
         return EBUSY;
     std::size_t const slash = path.rfind('/');
     name = path.substr(slash + 1);

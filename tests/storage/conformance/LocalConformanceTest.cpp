@@ -4,5 +4,6 @@
 namespace foundation::storage::conformance {
 
 FOUNDATION_STORAGE_CONFORMANCE(Local, localHarness());
+FOUNDATION_STORAGE_CONFORMANCE(ConfinedLocal, confinedLocalHarness());
 
 } // namespace foundation::storage::conformance

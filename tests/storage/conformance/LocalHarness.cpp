@@ -4,6 +4,7 @@
 #include <storage/local/LocalProvider.hpp>
 #include <tests/support/TemporaryFolder.hpp>
 
+#include <boost/property_tree/ptree.hpp>
 #include <fcntl.h>
 #include <filesystem>
 #include <set>
@@ -24,6 +25,23 @@ Place makePlace()
 {
     auto const folder = std::make_shared<tests::support::TemporaryFolder>();
     return {std::make_shared<local::LocalProvider>(), folder->iri(), folder};
+}
+
+Place makeConfinedPlace()
+{
+    auto const folder = std::make_shared<tests::support::TemporaryFolder>();
+    auto const provider = std::make_shared<local::LocalProvider>();
+    boost::property_tree::ptree settings;
+    settings.put("root", folder->path().native());
+    provider->configure(settings);
+    return {provider, folder->iri(), folder};
+}
+
+/// Links that do not name the folder in which they work.
+void makeRelativeLink(provider::StorageIRI const& link, provider::StorageIRI const& target)
+{
+    std::filesystem::path const path = native(link);
+    std::filesystem::create_symlink(std::filesystem::path(native(target)).lexically_relative(path.parent_path()), path);
 }
 
 std::set<std::string> attributesOfEveryFile()
@@ -63,6 +81,15 @@ Harness localHarness()
             .secondName = [](auto& name, auto& file) { std::filesystem::create_hard_link(native(file), native(name)); },
             .specialFile = [](auto& path) { ::mkfifo(native(path).c_str(), 0600); }},
     };
+}
+
+Harness confinedLocalHarness()
+{
+    Harness harness = localHarness();
+    harness.makePlace = makeConfinedPlace;
+    harness.capabilities.servesTop = false;
+    harness.makers.symbolicLink = makeRelativeLink;
+    return harness;
 }
 
 } // namespace foundation::storage::conformance
