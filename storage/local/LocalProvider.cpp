@@ -111,7 +111,10 @@ void LocalProvider::doCreateFile(StorageIRI const& iri) const
 {
     auto const root = this->root();
     FileDescriptor file;
-    if (int const error = root->open(root->pathOf(iri), O_WRONLY | O_CREAT | O_EXCL, file))
+    int error = root->open(root->pathOf(iri), O_WRONLY | O_CREAT | O_EXCL, file);
+    if (error == 0)
+        error = file.close();
+    if (error != 0)
         throwError(error, iri);
 }
 

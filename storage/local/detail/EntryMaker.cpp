@@ -25,12 +25,21 @@ int getTargetStatus(ListedFolder const& folder, char const* name, Status& status
     return error == 0 && isLink(status) ? root.getStatus(folder.path->pathOf(name), Links::Follow, status) : error;
 }
 
-bool leadsToFolder(ListedFolder const& folder, FoundName const& found)
+/// A link is listed wherever it leads, but not otherwise than it is because something runs out.
+bool isShortage(int error)
 {
+    return error == ENOMEM || error == EMFILE || error == ENFILE;
+}
+
+int findWhetherFolder(ListedFolder const& folder, FoundName const& found, bool& answer)
+{
+    answer = found.isFolder();
     if (found.isDecided())
-        return found.isFolder();
+        return 0;
     Status status;
-    return getTargetStatus(folder, found.name.data(), status) == 0 && isFolder(status);
+    int const error = getTargetStatus(folder, found.name.data(), status);
+    answer = error == 0 && isFolder(status);
+    return isShortage(error) ? error : 0;
 }
 
 } // namespace
@@ -61,7 +70,9 @@ int EntryMaker::make(ListedFolder const& folder, FoundName const& found, std::op
         name.insert(0, folder.prefix);
     if (selection_.detail == Detail::Attributes)
         return makeWithAttributes(folder, found, std::move(name), entry);
-    bool const isFolder = leadsToFolder(folder, found);
+    bool isFolder = false;
+    if (int const error = findWhetherFolder(folder, found, isFolder))
+        return error;
     if (selection_.wantsKind(isFolder))
         entry.emplace(std::move(name), isFolder ? FolderEntry::EntryType::Folder : FolderEntry::EntryType::File);
     return 0;
@@ -71,11 +82,11 @@ int EntryMaker::makeWithAttributes(ListedFolder const& folder, FoundName const& 
                                    std::optional<FolderEntry>& entry) const
 {
     Status status;
-    if (getTargetStatus(folder, found.name.data(), status) != 0) {
-        int const error = getStatus({folder.descriptor, found.name.data()}, Links::Keep, status);
-        if (error != 0)
-            return error == ENOENT ? 0 : error;
-    }
+    int error = getTargetStatus(folder, found.name.data(), status);
+    if (error != 0 && !isShortage(error))
+        error = getStatus({folder.descriptor, found.name.data()}, Links::Keep, status);
+    if (error != 0)
+        return error == ENOENT ? 0 : error;
     if (!selection_.wantsKind(isFolder(status)))
         return 0;
     if (isFolder(status))

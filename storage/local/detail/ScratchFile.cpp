@@ -118,15 +118,18 @@ int ScratchFile::findTarget(Status& status) const
 {
     if (int const error = getStatus(targetAt(), Links::Keep, status))
         return error;
-    bool const isLost = isLink(status) && root_.getStatus(path_, Links::Follow, status) != 0;
-    return isLost ? ENOENT : 0;
+    int const error = isLink(status) ? root_.getStatus(path_, Links::Follow, status) : 0;
+    return isUnreachable(error) ? ENOENT : error;
 }
 
 /// The content of a file that others may not read is not for them while it is being written either.
 mode_t ScratchFile::modeForNew(mode_t mode) const
 {
     Status target;
-    return findTarget(target) == 0 && S_ISREG(target.stx_mode) ? target.stx_mode & permissionBits : mode;
+    int const error = findTarget(target);
+    if (error != 0 && !meansMissing(error))
+        throwError(error, target_);
+    return error == 0 && S_ISREG(target.stx_mode) ? target.stx_mode & permissionBits : mode;
 }
 
 void ScratchFile::commit(ReplacementPolicy policy)

@@ -1,24 +1,44 @@
 #include <storage/local/detail/attributes.hpp>
 
+#include <fl/filesystem/native_name.hpp>
+#include <storage/local/detail/errorCode.hpp>
+
+#include <cerrno>
 #include <cstdint>
 #include <unistd.h>
 #include <utility>
 
 namespace foundation::storage::local::detail {
 
+using provider::StorageIRI;
+
 namespace {
 
 namespace posix_time = boost::posix_time;
 
+bool meansUnwritable(int error)
+{
+    return meansMissing(error) || error == EACCES || error == EPERM || error == EROFS || error == ETXTBSY;
+}
+
+/// What cannot be found out is not taken for a "no".
+bool isWritable(Root const& root, std::string const& path)
+{
+    int const error = root.checkAccess(path, W_OK);
+    if (error != 0 && !meansUnwritable(error))
+        throwError(error, StorageIRI(StorageIRI(u"file:///"), fl::filesystem::from_native_bytes(path)));
+    return error == 0;
+}
+
 auto deferredWritability(std::shared_ptr<Root const> root, std::string path)
 {
-    return [root = std::move(root), path = std::move(path)] { return root->checkAccess(path, W_OK) == 0; };
+    return [root = std::move(root), path = std::move(path)] { return isWritable(*root, path); };
 }
 
 auto deferredWritability(std::shared_ptr<FolderPath const> folder, std::string_view name)
 {
     return [folder = std::move(folder), name = std::string(name)] {
-        return folder->root->checkAccess(folder->pathOf(name), W_OK) == 0;
+        return isWritable(*folder->root, folder->pathOf(name));
     };
 }
 

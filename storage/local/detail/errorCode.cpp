@@ -80,4 +80,9 @@ bool meansMissing(int error)
     return error == ENOENT || error == ENOTDIR || error == ELOOP || error == ENAMETOOLONG;
 }
 
+bool isUnreachable(int error)
+{
+    return meansMissing(error) || error == EACCES;
+}
+
 } // namespace foundation::storage::local::detail

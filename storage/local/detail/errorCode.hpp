@@ -18,4 +18,7 @@ FOUNDATION_API provider::ErrorCode toErrorCode(int error);
 /// of a folder, links that loop, or a name longer than any name can be.
 bool meansMissing(int error);
 
+/// Whether an `errno` says that a link leads nowhere, or where this user may not look.
+bool isUnreachable(int error);
+
 } // namespace foundation::storage::local::detail

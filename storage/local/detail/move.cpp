@@ -6,6 +6,7 @@
 
 #include <cerrno>
 #include <cstdio>
+#include <optional>
 #include <unistd.h>
 
 namespace foundation::storage::local::detail {
@@ -108,6 +109,13 @@ int moveFolderOntoNewFolder(Move const& move)
     return error;
 }
 
+/// It is gone when the target had become another file.
+int removeScratch(Located const& scratch)
+{
+    int const error = removeName(scratch.at());
+    return error == ENOENT ? 0 : error;
+}
+
 /// From one name of a file to another, which `rename` leaves both as they are. Once it has a name that nobody else
 /// knows, neither name can have come to mean another file when it goes.
 int moveBetweenNames(Move const& move)
@@ -119,31 +127,59 @@ int moveBetweenNames(Move const& move)
         return error;
     if (int const error = renameEntry(move.source.at(), scratch.at(), RENAME_NOREPLACE))
         return error;
-    int const error = renameEntry(scratch.at(), move.target.at(), 0);
+    int error = renameEntry(scratch.at(), move.target.at(), 0);
+    if (error == 0)
+        error = removeScratch(scratch);
     if (error != 0)
         renameEntry(scratch.at(), move.source.at(), RENAME_NOREPLACE);
-    else
-        removeName(scratch.at());
     return error;
+}
+
+/// What stands at the target; nothing where nothing is. Not to know is a failure: what a guess replaces is lost.
+std::optional<Status> findTarget(Move const& move, Links links)
+{
+    Status status;
+    int const error = links == Links::Keep ? getStatus(move.target.at(), Links::Keep, status)
+                                           : move.root.getStatus(move.toPath, Links::Follow, status);
+    if (meansMissing(error))
+        return std::nullopt;
+    if (error != 0)
+        throwError(error, move.to);
+    return status;
 }
 
 /// Renamed over that file the link would lead to itself, and the content be lost.
 bool isLinkTo(Status const& target, Move const& move, Status const& source)
 {
+    if (!isLink(source) || isFolder(target))
+        return false;
     Status followed;
-    return isLink(source) && move.root.getStatus(move.fromPath, Links::Follow, followed) == 0 &&
-           isSameFile(followed, target);
+    int const error = move.root.getStatus(move.fromPath, Links::Follow, followed);
+    if (error != 0 && !meansMissing(error))
+        throwError(error, move.from);
+    return error == 0 && isSameFile(followed, target);
+}
+
+/// Also by a link, if it leads where this user may look.
+bool isFolderAtTarget(Status const& target, Move const& move)
+{
+    if (!isLink(target))
+        return isFolder(target);
+    Status followed;
+    int const error = move.root.getStatus(move.toPath, Links::Follow, followed);
+    if (error != 0 && !isUnreachable(error))
+        throwError(error, move.to);
+    return error == 0 && isFolder(followed);
 }
 
 int moveFileReplacing(Move const& move, Status const& source)
 {
-    Status target;
-    bool const exists = getStatus(move.target.at(), Links::Keep, target) == 0;
-    if (exists && isSameFile(source, target))
+    std::optional<Status> const target = findTarget(move, Links::Keep);
+    if (target && isSameFile(source, *target))
         return moveBetweenNames(move);
-    if (exists && !isFolder(target) && isLinkTo(target, move, source))
+    if (target && isLinkTo(*target, move, source))
         return removeName(move.source.at());
-    if (exists && move.root.leadsToFolder(move.toPath))
+    if (target && isFolderAtTarget(*target, move))
         return EEXIST;
     int const error = renameEntry(move.source.at(), move.target.at(), 0);
     return error == EISDIR ? EEXIST : error;
@@ -151,8 +187,8 @@ int moveFileReplacing(Move const& move, Status const& source)
 
 bool isOntoItself(Move const& move, Status const& source)
 {
-    Status target;
-    return move.root.getStatus(move.toPath, Links::Follow, target) == 0 && isSameFile(source, target);
+    std::optional<Status> const target = findTarget(move, Links::Follow);
+    return target && isSameFile(source, *target);
 }
 
 } // namespace
