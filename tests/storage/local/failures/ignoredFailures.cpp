@@ -15,8 +15,8 @@ namespace {
 struct Case
 {
     char const* operation; ///< a regular expression for the whole name
-    char const* call;
-    char const* path; ///< a regular expression for what the call works on
+    char const* call;      ///< another one
+    char const* path;      ///< a regular expression for what the call works on
     bool (*isMeant)(int error);
     Ignored ignored;
     char const* reason;
@@ -42,16 +42,19 @@ bool isNoShortage(int error)
 
 constexpr Case cases[] = {
     {anything, "fadvise", anything, any, Ignored::WithSameResult, "it is advice; nothing depends on it"},
-    {"commit.*", "close", "(to/(new|existing)|from/link)", any, Ignored::WithSameResult,
+    {"commit.*|copy.*Atomic.*", "close", "(to/(new|existing)|from/link)", any, Ignored::WithSameResult,
      "the content is on the disk before it takes the place of the target"},
+    {anything, "ficlone|copy_file_range", anything, any, Ignored::WithSameResult,
+     "the content is read and written instead, which tells the end that fails"},
+    {"copyFileOntoItself", "close", "from/second name", any, Ignored::WithSameResult, "nothing was written"},
     {"abort|drop", "close", scratch, any, Ignored::WithSameResult, "the content is not wanted"},
     {"drop", "unlinkat", scratch, any, Ignored::WithSameResult, "a destructor has nobody to tell"},
     {anything, "openat2?", ".*/", isForbidden, Ignored::WithSameResult,
      "a folder that may not be read is synced with its whole file system"},
     {"moveFileOntoItself", "statx|openat2", "from/?", any, Ignored::WithSameResult,
      "not known to be onto itself, the file moves away and back"},
-    {"moveFileOntoLink|commitReplacingLink", "statx|openat2", "from/(link|file)", isForbidden, Ignored::WithSameResult,
-     "a link that leads where this user may not look is replaced like a broken one"},
+    {"(moveFileOnto|commitReplacing|copyFileAtomicReplacing)Link", "statx|openat2", "from/(link|file)", isForbidden,
+     Ignored::WithSameResult, "a link that leads where this user may not look is replaced like a broken one"},
     {"list.*", "statx|openat2", "from/.+", isNoShortage, Ignored::WithOtherResult,
      "an entry is asked about a second time without following it: a link is listed wherever it leads"},
     {"getFileAttributes|getFolderAttributes", "faccessat|openat2", "from/.+", isForbidden, Ignored::WithOtherResult,
