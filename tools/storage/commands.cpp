@@ -18,6 +18,7 @@ std::span<Command const> commands()
         Command{"mv", "Move or rename files and folders", defineMv},
         Command{"rm", "Remove files and folders", defineRm},
         Command{"mkdir", "Make folders", defineMkdir},
+        Command{"watch", "Tell what happens to files and folders, as it happens", defineWatch},
         Command{"schemes", "List the schemes of the stores that can be reached", defineSchemes},
         Command{"completion", "Print a script that has a shell complete commands", defineCompletion},
         Command{"man", "Print the manual page, as roff", defineMan},

@@ -20,6 +20,7 @@ Action defineRm(CLI::App& app);
 Action defineSchemes(CLI::App& app);
 Action defineStat(CLI::App& app);
 Action defineTree(CLI::App& app);
+Action defineWatch(CLI::App& app);
 
 /// Every command, in the order of the help.
 std::span<Command const> commands();

@@ -1,6 +1,7 @@
 #include <tools/storage/describe.hpp>
 
 #include <storage/provider/ByteStreamFailure.hpp>
+#include <storage/provider/ChangeEventExceptions.hpp>
 #include <storage/provider/Exception.hpp>
 
 #include <exception>
@@ -50,6 +51,10 @@ void rethrowAsFailure(Place const& place)
         throw Failure{place.text(), describe(error.getErrorCode())};
     } catch (provider::ByteStreamFailure const& error) {
         throw Failure{place.text(), describe(error.getErrorCode())};
+    } catch (provider::ChangeEventsNotSupportedException const&) {
+        throw Failure{place.text(), "the store does not tell of changes"};
+    } catch (provider::ChangeEventsSubscriptionException const&) {
+        throw Failure{place.text(), "cannot be watched (it may not be read, or the system is out of watches)"};
     } catch (std::bad_alloc const&) {
         throw;
     } catch (std::exception const& error) {

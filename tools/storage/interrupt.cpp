@@ -1,5 +1,6 @@
 #include <tools/storage/interrupt.hpp>
 
+#include <array>
 #include <atomic>
 #include <cerrno>
 #include <csignal>
@@ -83,6 +84,16 @@ void checkInterrupt()
 void waitForInput(int descriptor)
 {
     waitFor(descriptor, POLLIN);
+}
+
+bool waitForInputWhileRead(int descriptor, int output)
+{
+    HeldInterrupts const held;
+    std::array<pollfd, 2> wanted{pollfd{descriptor, POLLIN, 0}, pollfd{output, 0, 0}};
+    do
+        checkInterrupt();
+    while (::ppoll(wanted.data(), wanted.size(), nullptr, &held.maskBefore()) == -1 && errno == EINTR);
+    return (wanted[1].revents & POLLERR) == 0;
 }
 
 void waitForOutput(int descriptor)

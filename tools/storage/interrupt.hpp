@@ -39,6 +39,9 @@ private:
 /// wait.
 void waitForInput(int descriptor);
 
+/// The same, also until `output` is a pipe whose reader has gone. Answers whether it is not.
+bool waitForInputWhileRead(int descriptor, int output);
+
 /// Waits until a descriptor can be written. Throws `Interrupted` only if that takes waiting, so that what was done
 /// before an interrupt can be told.
 void waitForOutput(int descriptor);
