@@ -104,11 +104,6 @@ std::string folderOf(std::string const& path)
     return path.substr(0, path.find('/'));
 }
 
-std::string toBytes(std::u16string const& name)
-{
-    return {name.begin(), name.end()};
-}
-
 /// Whether a failure names an end of an operation, or the scratch file beside it, or an entry below or above it where
 /// the operation works on those too.
 bool names(Operation const& operation, std::string const& place, std::string const& end)
@@ -137,43 +132,11 @@ bool blames(Operation const& operation, SystemCall const& call, std::string cons
     return (mayBeFrom && namesFrom) || (mayBeTo && namesTo);
 }
 
-bool isEntry(Tree const& tree, std::string const& path, std::string const& content)
-{
-    auto const entry = tree.find(path);
-    return entry != tree.end() && entry->second == content;
-}
-
-/// Whether each entry is as before or as after, and none is missing that is the same in both.
-bool isMixture(Tree const& tree, Tree const& before, Tree const& after)
-{
-    for (auto const& [path, content] : tree)
-        if (!isEntry(before, path, content) && !isEntry(after, path, content))
-            return false;
-    for (auto const& [path, content] : before)
-        if (isEntry(after, path, content) && !isEntry(tree, path, content))
-            return false;
-    return true;
-}
-
 /// What a failed removal of a scratch file leaves is no fault of the operation.
 Tree withoutScratch(Tree tree)
 {
     std::erase_if(tree, [](auto const& entry) { return isScratch(entry.first); });
     return tree;
-}
-
-bool mayLeave(Operation const& operation, Tree tree, Tree before, Tree after)
-{
-    if (tree == before || tree == after)
-        return true;
-    if (operation.leaves == Leaves::SomeEntries)
-        return isMixture(tree, before, after);
-    if (operation.leaves != Leaves::PartOfContent)
-        return false;
-    std::string const written = toBytes(operation.to.empty() ? operation.from : operation.to);
-    for (Tree* const each : {&tree, &before, &after})
-        each->erase(written);
-    return tree == before || tree == after;
 }
 
 bool removesScratch(SystemCall const& call)

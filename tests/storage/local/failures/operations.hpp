@@ -54,4 +54,10 @@ std::vector<Operation> listingOperations();
 
 std::vector<Operation> allOperations();
 
+/// Whether an operation that failed may leave this, given what was there before and what it leaves when it is done.
+bool mayLeave(Operation const& operation, Tree tree, Tree before, Tree after);
+
+/// A location of an operation, as in the paths of a tree.
+std::string toBytes(std::u16string const& name);
+
 } // namespace foundation::tests::support
