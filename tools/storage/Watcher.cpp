@@ -221,7 +221,8 @@ void Watcher::startAgain()
         else
             watch.place.item().stopPublishingFileEvents();
     }
-    for (auto const& [location, watch] : before) {
+    for (auto const& each : before) {
+        Watch const& watch = each.second;
         if (!watch.isOperand)
             continue;
         session_.complain({watch.place.text(), "changes were missed, because too many came at once"});
