@@ -1,4 +1,5 @@
-// What does it cost to list the names of a large folder, beside the standard library and the bare system call?
+// What does it cost to list a large folder, names only and with attributes, beside the standard library and the bare
+// system calls?
 //
 // The folder is made below $TMPDIR, and removed afterwards.
 
@@ -18,6 +19,7 @@
 #include <optional>
 #include <string>
 #include <sys/resource.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -57,21 +59,53 @@ std::size_t listWithStandardLibrary(bench::Folder const& listed)
     return total;
 }
 
-std::size_t listWithSystemCalls(bench::Folder const& listed)
+std::size_t listAttributesWithProvider(bench::Folder const& listed)
+{
+    LocalProvider const provider;
+    auto const listing = provider.listAll(locationOf(listed));
+    std::size_t total = 0;
+    for (FolderEntry const& entry : entries(*listing)) {
+        auto const modified = entry.getFileAttributes()->getLastModified();
+        benchmark::DoNotOptimize(modified);
+        total += entry.getName().size() + entry.getFileAttributes()->getSize();
+    }
+    return total;
+}
+
+/// Calls `use` with the descriptor of the folder and each name in it.
+template <typename Use>
+void forEachName(bench::Folder const& listed, Use const& use)
 {
     alignas(dirent64) static std::array<char, 32 * 1024> buffer;
     int const descriptor = ::open(listed.path().c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-    std::size_t total = 0;
     for (ssize_t size; (size = ::getdents64(descriptor, buffer.data(), buffer.size())) > 0;) {
         for (char const* record = buffer.data(); record != buffer.data() + size;) {
             char const* const name = record + offsetof(dirent64, d_name);
-            total += name[0] == '.' ? 0 : std::strlen(name);
+            if (name[0] != '.')
+                use(descriptor, name);
             std::uint16_t length;
             std::memcpy(&length, record + offsetof(dirent64, d_reclen), sizeof length);
             record += length;
         }
     }
     ::close(descriptor);
+}
+
+std::size_t listWithSystemCalls(bench::Folder const& listed)
+{
+    std::size_t total = 0;
+    forEachName(listed, [&](int, char const* name) { total += std::strlen(name); });
+    return total;
+}
+
+std::size_t listAttributesWithSystemCalls(bench::Folder const& listed)
+{
+    std::size_t total = 0;
+    forEachName(listed, [&](int descriptor, char const* name) {
+        struct statx status;
+        if (::statx(descriptor, name, AT_NO_AUTOMOUNT, STATX_TYPE | STATX_SIZE | STATX_MTIME, &status) == 0)
+            total += std::strlen(name) + status.stx_size;
+    });
     return total;
 }
 
@@ -88,6 +122,8 @@ void listing(benchmark::State& state)
 BENCHMARK(listing<listWithProvider>)->Name("names_LocalProvider")->Unit(benchmark::kMillisecond);
 BENCHMARK(listing<listWithStandardLibrary>)->Name("names_directory_iterator")->Unit(benchmark::kMillisecond);
 BENCHMARK(listing<listWithSystemCalls>)->Name("names_getdents64")->Unit(benchmark::kMillisecond);
+BENCHMARK(listing<listAttributesWithProvider>)->Name("attributes_LocalProvider")->Unit(benchmark::kMillisecond);
+BENCHMARK(listing<listAttributesWithSystemCalls>)->Name("attributes_statx")->Unit(benchmark::kMillisecond);
 
 long peakMemory()
 {
@@ -122,7 +158,9 @@ void addMemory(std::size_t count)
 {
     bench::Folder const listed(count);
     benchmark::AddCustomContext("memory to list " + std::to_string(count),
-                                std::to_string(growthOf(listWithProvider, listed)) + " KiB (directory_iterator " +
+                                std::to_string(growthOf(listWithProvider, listed)) + " KiB (with attributes " +
+                                    std::to_string(growthOf(listAttributesWithProvider, listed)) +
+                                    " KiB, directory_iterator " +
                                     std::to_string(growthOf(listWithStandardLibrary, listed)) + " KiB)");
 }
 

@@ -1,6 +1,7 @@
 #include <tests/support/allocations.hpp>
 
 #include <cstdlib>
+#include <malloc.h>
 
 // Replaces the allocation functions of the whole process, so that the libraries under test are counted too.
 
@@ -9,6 +10,12 @@ namespace {
 thread_local std::size_t calls = 0;
 thread_local std::size_t callToFail = 0; // 0: none
 thread_local std::ptrdiff_t living = 0;
+thread_local std::ptrdiff_t bytes = 0;
+
+std::ptrdiff_t sizeOf(void* memory)
+{
+    return static_cast<std::ptrdiff_t>(malloc_usable_size(memory));
+}
 
 void* allocate(std::size_t size)
 {
@@ -17,13 +24,16 @@ void* allocate(std::size_t size)
     if (memory == nullptr)
         throw std::bad_alloc();
     ++living;
+    bytes += sizeOf(memory);
     return memory;
 }
 
 void release(void* memory)
 {
-    if (memory != nullptr)
+    if (memory != nullptr) {
         --living;
+        bytes -= sizeOf(memory);
+    }
     std::free(memory);
 }
 
@@ -39,6 +49,11 @@ std::size_t allocations()
 std::ptrdiff_t livingAllocations()
 {
     return living;
+}
+
+std::ptrdiff_t livingBytes()
+{
+    return bytes;
 }
 
 FailingAllocation::FailingAllocation(std::size_t number)

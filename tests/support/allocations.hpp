@@ -11,6 +11,9 @@ std::size_t allocations();
 /// How many more blocks this thread has taken from `operator new` than it has given back.
 std::ptrdiff_t livingAllocations();
 
+/// The bytes of those blocks.
+std::ptrdiff_t livingBytes();
+
 /// How often `action` calls `operator new`.
 template <class Action>
 std::size_t allocationsOf(Action action)

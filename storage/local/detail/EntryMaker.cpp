@@ -60,7 +60,6 @@ FileDescriptor openListed(FolderPath const& path, StorageIRI const& folder)
 
 int EntryMaker::make(ListedFolder const& folder, FoundName const& found, std::optional<FolderEntry>& entry) const
 {
-    entry.reset();
     if (found.isDecided() && !selection_.wantsKind(found.isFolder()))
         return 0;
     std::u16string name = fl::filesystem::from_native_bytes(found.name);
@@ -78,7 +77,7 @@ int EntryMaker::make(ListedFolder const& folder, FoundName const& found, std::op
     return 0;
 }
 
-int EntryMaker::makeWithAttributes(ListedFolder const& folder, FoundName const& found, std::u16string name,
+int EntryMaker::makeWithAttributes(ListedFolder const& folder, FoundName const& found, std::u16string&& name,
                                    std::optional<FolderEntry>& entry) const
 {
     Status status;

@@ -40,13 +40,13 @@ class EntryMaker
 public:
     explicit EntryMaker(Selection selection) : selection_(std::move(selection)) {}
 
-    /// Puts the entry of a name that was found into `entry`, or nothing where it is not selected, or is there no more.
-    /// Answers 0 or `errno`.
+    /// Puts the entry of a name that was found into `entry`, which is empty; nothing where it is not selected, or is
+    /// there no more. Answers 0 or `errno`.
     [[nodiscard]] int make(ListedFolder const& folder, FoundName const& found,
                            std::optional<provider::FolderEntry>& entry) const;
 
 private:
-    int makeWithAttributes(ListedFolder const& folder, FoundName const& found, std::u16string name,
+    int makeWithAttributes(ListedFolder const& folder, FoundName const& found, std::u16string&& name,
                            std::optional<provider::FolderEntry>& entry) const;
 
     Selection selection_;

@@ -11,8 +11,9 @@ namespace foundation::storage::local::detail {
 
 namespace {
 
-/// Hundreds of entries per call: beyond that a larger buffer gains nothing.
-constexpr std::size_t bufferSize = 32 * 1024;
+/// Hundreds of entries per call: a larger buffer saves nothing that counts, and what the system has read of so many
+/// more entries has left the caches before they are asked about.
+constexpr std::size_t bufferSize = 16 * 1024;
 
 bool isSelfOrParent(char const* name)
 {

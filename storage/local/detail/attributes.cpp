@@ -3,8 +3,11 @@
 #include <fl/filesystem/native_name.hpp>
 #include <storage/local/detail/errorCode.hpp>
 
+#include <array>
 #include <cerrno>
+#include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <unistd.h>
 #include <utility>
 
@@ -35,11 +38,32 @@ auto deferredWritability(std::shared_ptr<Root const> root, std::string path)
     return [root = std::move(root), path = std::move(path)] { return isWritable(*root, path); };
 }
 
-auto deferredWritability(std::shared_ptr<FolderPath const> folder, std::string_view name)
+/// Writability of an entry with a name of ordinary length, which is kept within: a listing makes one of these for each
+/// entry, and shares the folder among them.
+class EntryWritability
 {
-    return [folder = std::move(folder), name = std::string(name)] {
-        return isWritable(*folder->root, folder->pathOf(name));
-    };
+public:
+    static constexpr std::size_t longestName = 47;
+
+    EntryWritability(std::shared_ptr<FolderPath const> folder, std::string_view name)
+        : folder_(std::move(folder)), length_(static_cast<unsigned char>(name.size()))
+    {
+        name.copy(name_.data(), name.size());
+    }
+
+    bool operator()() const { return isWritable(*folder_->root, folder_->pathOf({name_.data(), length_})); }
+
+private:
+    std::shared_ptr<FolderPath const> folder_;
+    std::array<char, longestName> name_;
+    unsigned char length_;
+};
+
+std::function<bool()> deferredWritability(std::shared_ptr<FolderPath const> folder, std::string_view name)
+{
+    if (name.size() <= EntryWritability::longestName)
+        return EntryWritability(std::move(folder), name);
+    return deferredWritability(folder->root, folder->pathOf(name));
 }
 
 } // namespace

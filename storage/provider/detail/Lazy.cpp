@@ -4,11 +4,6 @@
 
 namespace foundation::storage::provider::detail {
 
-Lazy<bool>::Lazy(Value value) : value_(std::move(value))
-{
-    publishIfKnown();
-}
-
 Lazy<bool>::Lazy(Lazy const& other) : value_(copyValueOf(other))
 {
     publishIfKnown();
@@ -29,11 +24,6 @@ Lazy<bool>::Value Lazy<bool>::copyValueOf(Lazy const& other)
 {
     std::lock_guard const lock(other.mutex_);
     return other.value_;
-}
-
-void Lazy<bool>::publishIfKnown()
-{
-    resolved_.store(boost::get<bool>(&value_), std::memory_order_release);
 }
 
 } // namespace foundation::storage::provider::detail

@@ -77,6 +77,10 @@ std::size_t narrow_ascii_blocks(std::u16string_view /*text*/, char* /*out*/, std
 inline std::size_t widen_ascii(std::string_view text, char16_t* out) noexcept
 {
     std::size_t done = widen_ascii_blocks<8>(text, out, widen_ascii_blocks<16>(text, out, 0));
+    // What is left of most texts is copied in one more block, of which the first part is copied once more.
+    if (done != 0 && text.size() - done < 8 && widen_ascii_blocks<8>(text, out, text.size() - 8) == text.size()) {
+        return text.size();
+    }
     for (; done < text.size() && static_cast<unsigned char>(text[done]) < 0x80; ++done) {
         out[done] = static_cast<unsigned char>(text[done]);
     }

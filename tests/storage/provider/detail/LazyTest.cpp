@@ -123,6 +123,26 @@ TEST(Lazy, CopyMadeAfterAFailureComputesForItself)
     EXPECT_TRUE(copy());
 }
 
+TEST(Lazy, MovedOneTakesTheFunctionAlong)
+{
+    auto const counter = std::make_shared<int>(0);
+    Lazy<bool> original = lazy([counter] { return ++*counter == 1; });
+    long const owners = counter.use_count();
+    Lazy<bool> moved(std::move(original));
+    EXPECT_EQ(counter.use_count(), owners);
+    EXPECT_TRUE(moved());
+    EXPECT_TRUE(moved());
+    EXPECT_EQ(*counter, 1);
+}
+
+TEST(Lazy, MovedOneAnswersOutOfItself)
+{
+    auto original = std::make_unique<Lazy<bool>>(Value(true));
+    Lazy<bool> moved(std::move(*original));
+    original.reset();
+    EXPECT_TRUE(moved());
+}
+
 TEST(LazyConcurrency, FunctionIsCalledOnceHoweverManyThreadsAsk)
 {
     for (int round = 0; round < 20; ++round) {
