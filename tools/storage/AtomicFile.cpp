@@ -16,14 +16,18 @@ constexpr provider::ByteStreamOpenOptions newFile{
 
 } // namespace
 
-AtomicFile::AtomicFile(provider::StorageItem const& target, Replace replace) : TargetFile(target)
+AtomicFile::AtomicFile(provider::StorageItem const& target, Replace replace, bool isSynced) : TargetFile(target)
 {
     if (replace == Replace::Files) {
         transaction_ = target.openTransactionalStream(newFile);
         return;
     }
     scratch_.emplace(target.getParent(), makeScratchName());
-    scratchStream_ = scratch_->openStream(newFile);
+    // Stores sync at the commit of a transaction, not where a stream is closed.
+    if (isSynced)
+        transaction_ = scratch_->openTransactionalStream(newFile);
+    else
+        scratchStream_ = scratch_->openStream(newFile);
 }
 
 AtomicFile::~AtomicFile()
@@ -38,12 +42,13 @@ provider::ByteStream& AtomicFile::stream()
 
 void AtomicFile::publish()
 {
-    if (transaction_ != nullptr) {
+    if (transaction_ != nullptr)
         transaction_->close(provider::StreamClosePolicy::Commit);
-    } else {
+    else
         scratchStream_->close();
+    isCommitted_ = transaction_ != nullptr;
+    if (scratch_)
         moveToTarget();
-    }
     isFinished_ = true;
 }
 
@@ -71,7 +76,7 @@ bool AtomicFile::discard() noexcept
         return true;
     isFinished_ = true;
     try {
-        if (transaction_ != nullptr) {
+        if (transaction_ != nullptr && !isCommitted_) {
             transaction_->close(provider::StreamClosePolicy::Abort);
         } else {
             scratchStream_.reset();

@@ -16,7 +16,8 @@ namespace foundation::storage::tool {
 class AtomicFile final : public TargetFile
 {
 public:
-    AtomicFile(provider::StorageItem const& target, Replace replace);
+    /// `isSynced` has the content on the disk before it takes the name, in a store that was told to sync.
+    AtomicFile(provider::StorageItem const& target, Replace replace, bool isSynced = false);
     ~AtomicFile() override;
 
     bool discard() noexcept override;
@@ -32,6 +33,7 @@ private:
     std::optional<provider::StorageItem> scratch_;
     std::unique_ptr<provider::ByteStream> scratchStream_;
     std::unique_ptr<provider::TransactionalStream> transaction_;
+    bool isCommitted_ = false; ///< the transaction is through, though its file may not have the name yet
     bool isFinished_ = false;
 };
 

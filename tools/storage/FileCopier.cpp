@@ -6,9 +6,13 @@
 #include <tools/storage/interrupt.hpp>
 #include <tools/storage/readSome.hpp>
 
+#include <algorithm>
 #include <cstring>
 #include <memory>
 #include <optional>
+#include <storage/provider/Exception.hpp>
+#include <storage/provider/ExtendedFeature.hpp>
+#include <utility>
 
 namespace foundation::storage::tool {
 
@@ -35,9 +39,37 @@ std::unique_ptr<TargetFile> openTarget(Place const& target, CopyOptions const& o
     return at(target, [&]() -> std::unique_ptr<TargetFile> {
         if (options.isInPlace)
             return std::make_unique<PlainFile>(target.item(), options.replace);
-        return std::make_unique<AtomicFile>(target.item(), options.replace);
+        return std::make_unique<AtomicFile>(target.item(), options.replace, options.isSynced);
     });
 }
+
+/// Progress in a file that the store copies. Stores do not tell how much they copy between two questions: it is taken
+/// for a MiB, as local files do, until the end is known.
+class FileProgress
+{
+public:
+    FileProgress(Progress& progress, long size) : progress_(progress), rest_(size) {}
+
+    void addChunk()
+    {
+        if (std::exchange(hasBegun_, true))
+            add(std::min(rest_, chunk));
+    }
+    void addRest() { add(rest_); }
+
+private:
+    static constexpr long chunk = 1L << 20U;
+
+    void add(long count)
+    {
+        progress_.addBytes(count);
+        rest_ -= count;
+    }
+
+    Progress& progress_;
+    long rest_;
+    bool hasBegun_ = false;
+};
 
 /// To be called from a handler: throws what is being handled, together with what is left of the target.
 [[noreturn]] void rethrowWithLeftover(Place const& target, TargetFile const& output)
@@ -102,9 +134,33 @@ CopiedFile FileCopier::copy(Place const& source, Place const& target, TargetStat
     requireFileTarget(target, kind, options_.replace);
     if (options_.isInPlace && isLink(kind))
         throw Failure{target.text(), "a link, through which nothing is written"};
-    std::uint64_t const size = transfer(source, target, context);
+    bool const copiesItself = !options_.isInPlace && source.item().hasSameProviderInstance(target.item()) &&
+                              source.item().hasFeature(provider::ExtendedFeature::AtomicFileCopy);
+    std::uint64_t const size = copiesItself ? copyInStore(source, target, context) : transfer(source, target, context);
     progress_.addFile();
     return {size, false};
+}
+
+std::uint64_t FileCopier::copyInStore(Place const& source, Place const& target, WorkerContext& context) const
+{
+    auto const size = static_cast<long>(at(source, [&] { return source.item().getFileAttributes().getSize(); }));
+    FileProgress told(progress_, size);
+    auto const onChunk = [&] {
+        checkStop(context);
+        told.addChunk();
+        return provider::InterruptSignal::Continue;
+    };
+    auto const policy = options_.replace == Replace::Files ? provider::ReplacementPolicy::Overwrite
+                                                           : provider::ReplacementPolicy::NoClobber;
+    try {
+        source.item().copyFile(target.item(), {policy, provider::TransactionPolicy::Atomic, onChunk});
+    } catch (provider::Exception const& error) {
+        rethrowAsFailure(error.getStorageIRI() == target.item().getLocation() ? target : source);
+    } catch (std::exception const&) {
+        rethrowAsFailure(source);
+    }
+    told.addRest();
+    return static_cast<std::uint64_t>(size);
 }
 
 std::uint64_t FileCopier::transfer(Place const& source, Place const& target, WorkerContext& context) const

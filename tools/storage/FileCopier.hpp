@@ -16,6 +16,7 @@ struct CopyOptions
     Replace replace = Replace::Never;
     bool isInPlace = false; ///< each file is written at its target; otherwise it appears there whole or not at all
     bool isUpdate = false;  ///< what is up to date already is passed over
+    bool isSynced = false;  ///< each file is on the disk when it has been copied, in stores that were told to sync
 };
 
 /// What became of a file.
@@ -48,6 +49,8 @@ public:
     CopiedFile copy(Place const& source, Place const& target, TargetState state, WorkerContext& context) const;
 
 private:
+    /// The store copies by itself: the content does not pass through here.
+    std::uint64_t copyInStore(Place const& source, Place const& target, WorkerContext& context) const;
     std::uint64_t transfer(Place const& source, Place const& target, WorkerContext& context) const;
     std::uint64_t copyBytes(Place const& source, provider::ByteStream& input, Place const& target, TargetFile& output,
                             WorkerContext& context) const;

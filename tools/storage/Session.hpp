@@ -24,6 +24,7 @@ public:
     /// `command` is named in complaints; empty for the tool itself.
     explicit Session(std::string command);
 
+    Stores& stores() { return stores_; }
     Stores const& stores() const { return stores_; }
     Output& output() { return output_; }
     Progress& progress() { return progress_; }

@@ -9,6 +9,7 @@
 #include <tools/storage/Failure.hpp>
 #include <tools/storage/describe.hpp>
 
+#include <boost/property_tree/ptree.hpp>
 #include <cerrno>
 #include <fmt/format.h>
 #include <memory>
@@ -82,11 +83,24 @@ std::string explain(provider::Exception const& error, std::string const& argumen
     return describe(error.getErrorCode());
 }
 
+boost::property_tree::ptree localDurability(char const* durability)
+{
+    boost::property_tree::ptree settings;
+    settings.put("file.durability", durability);
+    return settings;
+}
+
 } // namespace
 
 Stores::Stores()
 {
     registry::registerAll(registry_);
+    registry_.configure(localDurability("none"));
+}
+
+void Stores::syncAll()
+{
+    registry_.configure(localDurability("full"));
 }
 
 provider::StorageItem Stores::openItem(std::string const& argument) const

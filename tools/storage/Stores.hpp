@@ -8,11 +8,15 @@
 
 namespace foundation::storage::tool {
 
-/// The stores that the tool can reach: those that are built in.
+/// The stores that the tool can reach: those that are built in. They do not wait for disks until they are told to.
 class Stores
 {
 public:
     Stores();
+
+    /// From now on what is committed, copied and moved, and the folders that are made, are on the disk when that is
+    /// done.
+    void syncAll();
 
     registry::Registry const& registry() const { return registry_; }
 

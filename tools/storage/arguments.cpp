@@ -99,6 +99,16 @@ void addFlag(CLI::App& app, std::string const& name, bool& value, std::string co
     app.add_flag(name, value, description);
 }
 
+void addSyncFlag(CLI::App& app, bool& value)
+{
+    addFlag(app, "--sync", value, "Go on only when the disk has what was written, so that it survives a power failure");
+}
+
+void exclude(CLI::App& app, std::string const& option, std::string const& other)
+{
+    app.get_option(option)->excludes(app.get_option(other));
+}
+
 void addOperands(CLI::App& app, std::string const& name, std::string const& description, std::size_t minimum,
                  std::vector<std::string>& values)
 {

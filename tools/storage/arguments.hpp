@@ -31,6 +31,12 @@ std::shared_ptr<CLI::FormatterBase> makeHelpFormatter();
 /// Declares a flag, which sets `value`. What these functions fill must live until the command line is parsed.
 void addFlag(CLI::App& app, std::string const& name, bool& value, std::string const& description);
 
+/// `--sync`, of the commands that write.
+void addSyncFlag(CLI::App& app, bool& value);
+
+/// Makes it a mistake to give both options.
+void exclude(CLI::App& app, std::string const& option, std::string const& other);
+
 /// Declares the operands of a command, which go to `values`. `name` is how the usage line shows them all.
 void addOperands(CLI::App& app, std::string const& name, std::string const& description, std::size_t minimum,
                  std::vector<std::string>& values);

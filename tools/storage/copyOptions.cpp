@@ -19,6 +19,7 @@ void addTransferOptions(CLI::App& app, std::string const& verbosity, TransferOpt
     addFlag(app, "--json", options.isJSON, "Print one JSON object a line for each, failed ones too");
     addFlag(app, "--progress", options.showsProgress,
             "Say each second how far it is, also where standard error is no terminal");
+    addSyncFlag(app, options.isSynced);
     addNumber(app, "-j,--jobs", "N", "Copy so many files at once; otherwise as many as there are processors",
               options.jobs);
 }

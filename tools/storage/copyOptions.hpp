@@ -19,6 +19,7 @@ struct TransferOptions
     bool isVerbose = false;
     bool isJSON = false;
     bool showsProgress = false;
+    bool isSynced = false;
     std::optional<std::size_t> jobs;
 };
 

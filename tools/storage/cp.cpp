@@ -30,6 +30,7 @@ CopyRunOptions runOptions(Options const& options)
     result.files.replace = options.replaces || options.isUpdate ? Replace::Files : Replace::Never;
     result.files.isInPlace = options.isInPlace;
     result.files.isUpdate = options.isUpdate;
+    result.files.isSynced = options.transfers.isSynced;
     result.telling = tellingOf(options.transfers);
     result.jobs = jobsOf(options.transfers);
     return result;
@@ -94,6 +95,8 @@ private:
 
 void copyAll(Session& session, Options const& options)
 {
+    if (options.transfers.isSynced)
+        session.stores().syncAll();
     std::vector<std::string> sources = options.paths;
     Place target = session.stores().open(sources.back());
     sources.pop_back();
@@ -114,6 +117,7 @@ Action defineCp(CLI::App& app)
     addFlag(app, "--in-place", options->isInPlace,
             "Write into the file at the target itself: what fails half-way leaves half of it");
     addTransferOptions(app, "Name each file that was copied", options->transfers);
+    exclude(app, "--sync", "--in-place");
     addOperands(app, "SOURCE... TARGET", "What to copy, and the folder that receives it, or its new name", 2,
                 options->paths);
     return [options](Session& session) { copyAll(session, *options); };

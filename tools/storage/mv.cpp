@@ -92,6 +92,7 @@ CopyRunOptions runOptions(Options const& options, Replace replace)
 {
     CopyRunOptions result;
     result.files.replace = replace;
+    result.files.isSynced = true;
     result.links = FileLinks::Refuse;
     result.telling = options.transfers.isJSON ? Telling::JSON : Telling::Nothing;
     result.jobs = jobsOf(options.transfers);
@@ -181,6 +182,8 @@ bool Move::moveWithinStore(Place const& source, Kind kind, Place const& target) 
 /// Answers whether it was moved; if not, that has been complained about.
 bool Move::moveByCopying(Place const& source, Kind kind, Place const& target)
 {
+    // The source goes: its copy must not be lost with the power.
+    session_.stores().syncAll();
     if (kind == Kind::RegularFile)
         return moveFileByCopying(source, target);
     if (kind != Kind::RegularFolder)
@@ -215,6 +218,8 @@ void Move::moveFolderByCopying(Place const& source, Place const& target)
 
 void moveAll(Session& session, Options const& options)
 {
+    if (options.transfers.isSynced)
+        session.stores().syncAll();
     std::vector<std::string> sources = options.paths;
     Place target = session.stores().open(sources.back());
     sources.pop_back();

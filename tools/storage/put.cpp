@@ -20,6 +20,7 @@ struct Options
     std::string target;
     bool replaces = false;
     bool isInPlace = false;
+    bool isSynced = false;
 };
 
 std::unique_ptr<TargetFile> openTarget(Place const& target, Options const& options)
@@ -32,7 +33,7 @@ std::unique_ptr<TargetFile> openTarget(Place const& target, Options const& optio
     return at(target, [&]() -> std::unique_ptr<TargetFile> {
         if (options.isInPlace)
             return std::make_unique<PlainFile>(target.item(), replace);
-        return std::make_unique<AtomicFile>(target.item(), replace);
+        return std::make_unique<AtomicFile>(target.item(), replace, options.isSynced);
     });
 }
 
@@ -52,6 +53,8 @@ long writeInput(Session& session, Place const& target, TargetFile& output)
 
 void put(Session& session, Options const& options)
 {
+    if (options.isSynced)
+        session.stores().syncAll();
     Place const target = session.stores().open(options.target);
     std::unique_ptr<TargetFile> const output = openTarget(target, options);
     try {
@@ -72,6 +75,8 @@ Action definePut(CLI::App& app)
     addFlag(app, "--replace", options->replaces, "Replace a file that is there already");
     addFlag(app, "--in-place", options->isInPlace,
             "Write into the file at the target itself: what fails half-way leaves half of it");
+    addSyncFlag(app, options->isSynced);
+    exclude(app, "--sync", "--in-place");
     addOperand(app, "TARGET", "The file that standard input becomes", options->target);
     return [options](Session& session) { put(session, *options); };
 }

@@ -11,33 +11,56 @@ namespace {
 
 using namespace std::chrono_literals;
 
-/// Copies of a file that is too large to be done before a signal comes: it has no blocks, but takes long to read.
+/// Copies of a file that is too large to be done before a signal comes.
 class Interrupt : public ToolTest
 {
 protected:
     void SetUp() override
     {
-        folder.write("big", "");
-        std::filesystem::resize_file(folder / "big", std::uintmax_t{64} << 30U);
+        makeEndless("big");
         makeFolder("t");
     }
 
-    bool hasScratchFile(std::string const& name) const
+    /// Of memory without end the system makes this one as it is read, so that no store can share or skip any of it.
+    void makeEndless(std::string const& name) const
     {
-        for (auto const& entry : std::filesystem::directory_iterator(folder / name)) {
-            if (entry.path().native().ends_with(".tmp.bak"))
-                return true;
-        }
-        return false;
+        std::filesystem::create_symlink("/proc/" + std::to_string(::getpid()) + "/pagemap", folder / name);
     }
 
-    /// Sends the signal while the tool copies to this folder, after it has made this entry.
+    /// It has no blocks, but takes long to read.
+    void makeHole(std::string const& name) const
+    {
+        std::filesystem::remove(folder / name);
+        folder.write(name, "");
+        std::filesystem::resize_file(folder / name, std::uintmax_t{64} << 30U);
+    }
+
+    /// Copying it takes a while, even where holes are skipped: each byte has a place of its own on the disk.
+    void makeScattered(std::string const& name) const
+    {
+        constexpr off_t pieces = 40000;
+        std::filesystem::remove(folder / name);
+        int const file = ::open((folder / name).c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600);
+        for (off_t i = 0; i < pieces; ++i)
+            ASSERT_EQ(::pwrite(file, "x", 1, i << 17U), 1);
+        ::close(file);
+    }
+
+    int countScratchFiles(std::string const& name) const
+    {
+        int count = 0;
+        for (auto const& entry : std::filesystem::directory_iterator(folder / name))
+            count += entry.path().native().ends_with(".tmp.bak") ? 1 : 0;
+        return count;
+    }
+
+    /// Sends the signal while the tool makes so many copies in this folder, after it has made this entry.
     ProgramResult interrupt(Arguments const& arguments, int signal, std::string const& target = "t",
-                            std::string const& entry = ".") const
+                            std::string const& entry = ".", int copies = 1) const
     {
         Process process(command(arguments), inFolder());
         auto const deadline = std::chrono::steady_clock::now() + 60s;
-        auto const isCopying = [&] { return exists(target + '/' + entry) && hasScratchFile(target); };
+        auto const isCopying = [&] { return exists(target + '/' + entry) && countScratchFiles(target) == copies; };
         while (!isCopying() && process.isRunning() && std::chrono::steady_clock::now() < deadline)
             std::this_thread::yield();
         EXPECT_TRUE(isCopying());
@@ -85,6 +108,7 @@ TEST_F(Interrupt, EndsARecursiveCopy)
 
 TEST_F(Interrupt, EndsAtOnceWhileNobodyReadsTheOutput)
 {
+    makeHole("big");
     makePipe("pipe");
     ProcessOptions options = inFolder();
     options.output = folder / "pipe";
@@ -114,9 +138,8 @@ TEST_F(Interrupt, TellsOfFilesThatWereDoneAfterOneThatWasNot)
 
 TEST_F(Interrupt, EndsEveryCopyThatIsUnderWay)
 {
-    folder.write("big2", "");
-    std::filesystem::resize_file(folder / "big2", std::uintmax_t{64} << 30U);
-    ProgramResult const result = interrupt({"cp", "-j2", "big", "big2", "t"}, SIGTERM);
+    makeEndless("big2");
+    ProgramResult const result = interrupt({"cp", "-j2", "big", "big2", "t"}, SIGTERM, "t", ".", 2);
     EXPECT_EQ(result.status, 143);
     EXPECT_EQ(result.errors, "storage: cp: interrupted: 0 of 2 files copied, 0 B\n");
     EXPECT_EQ(countEntries("t"), 0U);
@@ -125,8 +148,9 @@ TEST_F(Interrupt, EndsEveryCopyThatIsUnderWay)
 TEST_F(Interrupt, LeavesASourceThatIsMovedByCopying)
 {
     makeFolder("other");
-    if (!mount("other", "1m"))
+    if (!mount("other", "256m"))
         GTEST_SKIP() << "file systems may not be mounted here";
+    makeScattered("big");
     ProgramResult const result = interrupt({"mv", "big", "other"}, SIGINT, "other");
     EXPECT_EQ(result.status, 130);
     EXPECT_EQ(result.errors, "storage: mv: interrupted: 0 of 1 moved; 0 files copied, 0 B\n");
@@ -138,6 +162,12 @@ TEST_F(Interrupt, LeavesASourceThatIsMovedByCopying)
 class InterruptInPlace : public Interrupt
 {
 protected:
+    void SetUp() override
+    {
+        Interrupt::SetUp();
+        makeHole("big");
+    }
+
     ProgramResult interruptInPlace(Arguments const& arguments) const
     {
         Process process(command(arguments), inFolder());
