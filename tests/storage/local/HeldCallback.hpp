@@ -3,6 +3,8 @@
 #include <storage/provider/IProvider.hpp>
 
 #include <future>
+#include <memory>
+#include <utility>
 
 namespace foundation::tests::support {
 

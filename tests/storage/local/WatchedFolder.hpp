@@ -6,11 +6,14 @@
 #include <storage/local/LocalProvider.hpp>
 #include <tests/support/TemporaryFolder.hpp>
 
+#include <algorithm>
 #include <chrono>
 #include <condition_variable>
 #include <filesystem>
+#include <memory>
 #include <mutex>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace foundation::tests::support {
