@@ -1,9 +1,11 @@
 #include <tools/storage/TreeRemover.hpp>
 
 #include <storage/provider/Exception.hpp>
+#include <storage/provider/ExtendedFeature.hpp>
 #include <tools/storage/describe.hpp>
 #include <tools/storage/interrupt.hpp>
 #include <tools/storage/kinds.hpp>
+#include <tools/storage/leaveBehind.hpp>
 
 #include <utility>
 
@@ -14,7 +16,8 @@ TreeRemover::TreeRemover(Session& session) : session_(session) {}
 void TreeRemover::remove(Place const& folder)
 {
     check_ = nullptr;
-    walk(folder, std::nullopt);
+    if (!removesWhole(folder))
+        walk(folder, std::nullopt);
 }
 
 void TreeRemover::remove(Place const& folder, Place const& counterpart, Check check)
@@ -51,6 +54,28 @@ void TreeRemover::step()
         leaveFolder();
 }
 
+/// Lets the store remove a folder; answers whether it is gone. What the store went through to get at what stays is not
+/// tried again; a folder that stays itself is not entered, for something may be mounted on it.
+bool TreeRemover::removesWhole(Place const& folder)
+{
+    provider::StorageItem const& item = folder.item();
+    if (!item.hasFeature(provider::ExtendedFeature::RecursiveFolderRemoval))
+        return false;
+    if (stays_ && item.getLocation().isAncestorOf(*stays_))
+        return false;
+    try {
+        doOrLeaveBehind([item] { item.removeFolderRecursively(); });
+        return true;
+    } catch (provider::Exception const& error) {
+        stays_ = error.getStorageIRI();
+        if (*stays_ == item.getLocation())
+            rethrowAsFailure(folder);
+    } catch (std::exception const&) {
+        rethrowAsFailure(folder);
+    }
+    return false;
+}
+
 /// What a listing calls a folder may be a link to one.
 void TreeRemover::removeEntry(FolderLevel& level, ListedName const& entry)
 {
@@ -59,7 +84,10 @@ void TreeRemover::removeEntry(FolderLevel& level, ListedName const& entry)
     if (check_)
         counterpart = level.counterpart().child(entry.name);
     if (!entry.isFile && kindOf(child) == Kind::RegularFolder) {
-        levels_.enter(child, std::move(counterpart));
+        if (!check_ && removesWhole(child))
+            level.hasChanged = true;
+        else
+            levels_.enter(child, std::move(counterpart));
         return;
     }
     if (check_)

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <storage/provider/StorageIRI.hpp>
 #include <tools/storage/FolderStack.hpp>
 #include <tools/storage/Session.hpp>
 
@@ -9,6 +10,9 @@
 namespace foundation::storage::tool {
 
 /// Removes folders with all they hold, and never what a link leads to.
+///
+/// A store that can remove a whole folder does so; where something stays, what stays is gone through entry by entry, so
+/// that each is named.
 class TreeRemover
 {
 public:
@@ -26,6 +30,7 @@ public:
 private:
     void walk(Place const& folder, std::optional<Place> counterpart);
     void step();
+    bool removesWhole(Place const& folder);
     void removeEntry(FolderLevel& level, ListedName const& entry);
     bool leavesEntries(FolderLevel const& level);
     void leaveFolder();
@@ -34,6 +39,7 @@ private:
     Session& session_;
     Check check_;
     FolderStack levels_;
+    std::optional<provider::StorageIRI> stays_; ///< what the store last failed to remove
 };
 
 } // namespace foundation::storage::tool

@@ -9,7 +9,8 @@ namespace foundation::storage::tool {
 struct Interrupted
 {
     int signal;
-    std::string done = {}; ///< what was done until then, in words for the user; empty when there is nothing to say
+    std::string done = {};   ///< what was done until then, in words for the user; empty when there is nothing to say
+    bool leavesWork = false; ///< a thread is still at work, which nobody can stop
 };
 
 /// Makes SIGINT, SIGTERM and SIGHUP requests to stop, which work looks for between two steps. The third one ends the

@@ -57,6 +57,9 @@ int finish(std::string const& command, Work const& work)
         writeError(command, printable(failure.location) + ": " + printable(failure.reason));
     } catch (Interrupted const& interrupted) {
         writeError(command, interrupted.done.empty() ? "interrupted" : "interrupted: " + interrupted.done);
+        // Nothing that a thread still works with may be taken down.
+        if (interrupted.leavesWork)
+            ::_exit(128 + interrupted.signal);
         return 128 + interrupted.signal;
     } catch (OutputFailure const& failure) {
         return reportOutputFailure(failure, command);

@@ -1,5 +1,10 @@
 #include <tests/tools/storage/ToolTest.hpp>
 
+#include <tests/support/ScopedMount.hpp>
+#include <tests/support/deepFolders.hpp>
+
+#include <algorithm>
+
 namespace {
 
 using Rm = ToolTest;
@@ -99,6 +104,49 @@ TEST_F(Rm, GoesDeeperThanListingsCanBeOpen)
 {
     makeDeepFolder("a");
     EXPECT_EQ(runWithFewDescriptors({"rm", "-r", "a"}).status, 0);
+    EXPECT_FALSE(exists("a"));
+}
+
+TEST_F(Rm, NamesEachThatStays)
+{
+    if (!canRunUnprivileged())
+        GTEST_SKIP() << "no user without special rights can run the tool where it lies";
+    for (std::string const name : {"a/x/closed", "a/x/y/closed", "a/z"})
+        makeFolder(name);
+    for (std::string const name : {"a/x/closed/f", "a/x/y/closed/f", "a/x/y/closed/g", "a/x/f", "a/z/f"})
+        folder.write(name, "");
+    for (std::string const name : {"a", "a/x", "a/x/y", "a/z"})
+        std::filesystem::permissions(folder / name, std::filesystem::perms::all);
+    for (std::string const name : {"a/x/closed", "a/x/y/closed"})
+        std::filesystem::permissions(folder / name, std::filesystem::perms(0555));
+    ProgramResult const result = runUnprivileged({"rm", "-r", "a"});
+    EXPECT_EQ(result.status, 1);
+    for (std::string const name : {"a/x/closed/f", "a/x/y/closed/f", "a/x/y/closed/g"})
+        EXPECT_NE(result.errors.find("storage: rm: " + name + ": permission denied\n"), std::string::npos) << name;
+    EXPECT_EQ(std::count(result.errors.begin(), result.errors.end(), '\n'), 3);
+    EXPECT_FALSE(exists("a/x/f"));
+    EXPECT_FALSE(exists("a/z"));
+}
+
+TEST_F(Rm, LeavesWhatIsMountedBelow)
+{
+    makeFolder("a/b/mounted");
+    makeFolder("elsewhere");
+    folder.write("a/f", "");
+    folder.write("elsewhere/f", "");
+    auto const mount = foundation::tests::support::ScopedMount::bind(folder / "elsewhere", folder / "a/b/mounted");
+    if (!mount)
+        GTEST_SKIP() << "this user may not mount";
+    runFailing({"rm", "-r", "a"}, "storage: rm: a/b/mounted: in use by somebody else\n");
+    EXPECT_TRUE(exists("elsewhere/f"));
+    EXPECT_FALSE(exists("a/f"));
+}
+
+TEST_F(Rm, GoesDeeperThanAnyPath)
+{
+    makeFolder("a");
+    foundation::tests::support::makeDeepFolders(folder / "a", 60, std::string(250, 'd'));
+    runWell({"rm", "-r", "a"});
     EXPECT_FALSE(exists("a"));
 }
 
