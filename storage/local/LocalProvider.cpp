@@ -16,6 +16,7 @@
 #include <storage/local/detail/fileSystem.hpp>
 #include <storage/local/detail/move.hpp>
 #include <storage/local/detail/nativePath.hpp>
+#include <storage/local/detail/scratchName.hpp>
 #include <storage/local/detail/sync.hpp>
 #include <storage/provider/ChangeEventExceptions.hpp>
 
@@ -65,6 +66,18 @@ Located locate(Root const& root, std::string const& path, StorageIRI const& iri)
     if (int const error = root.locate(path, entry))
         throwError(error, iri);
     return entry;
+}
+
+/// Who writes to a scratch file and moves it to its place relies on it as on a transaction.
+void syncScratchFile(Settings const& settings, StorageIRI const& from)
+{
+    std::string const path = settings.root.pathOf(from);
+    FileDescriptor file;
+    if (settings.durability == Durability::None || !isScratchName(path.substr(path.rfind('/') + 1)) ||
+        settings.root.open(path, O_RDONLY | O_NOFOLLOW | O_NOCTTY | O_NONBLOCK, file) != 0)
+        return;
+    if (int const error = sync(file, file))
+        throwError(error, from);
 }
 
 void makeMoveDurable(Settings const& settings, StorageIRI const& from, StorageIRI const& to)
@@ -190,6 +203,7 @@ void LocalProvider::doRemoveFolderRecursively(StorageIRI const& iri) const
 void LocalProvider::doMoveFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
     auto const settings = this->settings();
+    syncScratchFile(*settings, from);
     detail::moveFile(settings->root, from, to, policy);
     makeMoveDurable(*settings, from, to);
 }

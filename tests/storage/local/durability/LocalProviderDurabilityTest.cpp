@@ -13,6 +13,7 @@
 #include <memory>
 #include <string>
 #include <unistd.h>
+#include <utility>
 #include <vector>
 
 namespace foundation::storage::local {
@@ -82,6 +83,28 @@ TEST_F(LocalProviderDurability, SyncsNothingUnderNone)
     EXPECT_EQ(record.told(), (Told{"create scratch", "write \"new\"", "rename scratch to file"}));
 }
 
+TEST_F(LocalProviderDurability, OfAnAtomicCopyIsThatOfACommit)
+{
+    folder.write("source", "new");
+    std::vector<std::pair<std::string, Told>> const rows{
+        {"full", {"sync scratch", "rename scratch to file", "sync " + folderName()}},
+        {"file", {"sync scratch", "rename scratch to file"}},
+        {"none", {"rename scratch to file"}},
+    };
+    for (auto const& [durability, end] : rows) {
+        configure(durability);
+        RecordedSystemCalls const record;
+        EXPECT_EQ(provider.copyFileAtomic(at(u"source"), at(u"file"), ReplacementPolicy::Overwrite, {}),
+                  TransactionStatus::Completed);
+        Told told = record.told();
+        ASSERT_GT(told.size(), end.size());
+        EXPECT_EQ(told.front(), "create scratch");
+        EXPECT_EQ(told[told.size() - end.size() - 1], "write \"new\"");
+        told.erase(told.begin(), told.end() - static_cast<std::ptrdiff_t>(end.size()));
+        EXPECT_EQ(told, end) << durability;
+    }
+}
+
 TEST_F(LocalProviderDurability, SyncsNothingThatIsAborted)
 {
     RecordedSystemCalls const record;
@@ -130,6 +153,14 @@ TEST_F(LocalProviderDurability, SyncsTheFolderOfTheTargetThenThatOfTheSourceOfAM
     configure("file");
     provider.moveFile(at(u"a/other"), at(u"file"), ReplacementPolicy::Preserve);
     EXPECT_EQ(record.told(), (Told{"rename other to file"}));
+}
+
+TEST_F(LocalProviderDurability, SyncsAScratchFileThatItsWriterMovesToItsPlace)
+{
+    folder.write("7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak", "new");
+    RecordedSystemCalls const record;
+    provider.moveFile(at(u"7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak"), at(u"new"), ReplacementPolicy::NoClobber);
+    EXPECT_EQ(record.told(), (Told{"sync scratch", "rename scratch to new", "sync " + folderName()}));
 }
 
 TEST_F(LocalProviderDurability, IsThatOfTheSettingsThatAStreamWasOpenedWith)

@@ -2,7 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include <storage/local/detail/ScratchFile.hpp>
 #include <storage/provider/Exception.hpp>
 #include <tests/storage/local/durability/SharedMemory.hpp>
 #include <tests/support/TemporaryFolder.hpp>
@@ -95,6 +94,7 @@ protected:
         provider.configure(settings);
         for (unsigned process = 0; process < processCount; ++process)
             folder.write("source" + std::to_string(process), std::to_string(process));
+        folder.write("copied", "content");
     }
 
     static std::u16string sourceOf(unsigned process)
@@ -112,9 +112,11 @@ protected:
 
     void move(unsigned process) const { provider.moveFile(folder.iri(sourceOf(process)), target, policyOf(process)); }
 
-    void publish(unsigned process) const
+    void copy(unsigned process) const
     {
-        detail::ScratchFile(root, target, detail::Durability::None).commit(policyOf(process));
+        auto const status = provider.copyFileAtomic(folder.iri(u"copied"), target, policyOf(process), {});
+        if (status != TransactionStatus::Completed)
+            throw std::logic_error("a copy that was not aborted is not completed");
     }
 
     /// Lets all processes attempt to get the name, round after round, and looks at each outcome.
@@ -158,7 +160,6 @@ protected:
     }
 
     TemporaryFolder const folder;
-    detail::Root const root;
     LocalProvider provider;
     StorageIRI const target = folder.iri(u"target");
     SharedMemory<Meeting> const meeting;
@@ -175,10 +176,10 @@ TEST_F(OneWinnerAmongProcesses, MovesItsFileThere)
     run([this](unsigned process, int) { move(process); });
 }
 
-TEST_F(OneWinnerAmongProcesses, PutsItsScratchFileThere)
+TEST_F(OneWinnerAmongProcesses, CopiesAFileThere)
 {
-    run([this](unsigned process, int) { publish(process); });
-    EXPECT_EQ(std::distance(fs::directory_iterator(folder.path()), {}), processCount) << "scratch files are left";
+    run([this](unsigned process, int) { copy(process); });
+    EXPECT_EQ(std::distance(fs::directory_iterator(folder.path()), {}), processCount + 1) << "scratch files are left";
 }
 
 TEST_F(OneWinnerAmongProcesses, WinsAgainstOthersThatDoOtherwise)
@@ -190,7 +191,7 @@ TEST_F(OneWinnerAmongProcesses, WinsAgainstOthersThatDoOtherwise)
         case 1:
             return move(process);
         default:
-            return publish(process);
+            return copy(process);
         }
     });
 }

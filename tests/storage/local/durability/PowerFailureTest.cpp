@@ -29,12 +29,14 @@ using tests::support::TemporaryFolder;
 class PowerFailure : public testing::Test
 {
 protected:
-    PowerFailure() : model((folder.write("file", "0"), std::vector{folder.path()})) {}
+    PowerFailure() : model({folder.path()}) {}
 
     using Write = std::function<void(LocalProvider&, std::string const& content)>;
 
     void record(std::string const& durability, Write const& write)
     {
+        folder.write("file", "0");
+        model = PowerFailureModel({folder.path()});
         LocalProvider provider;
         boost::property_tree::ptree settings;
         settings.put("durability", durability);
@@ -80,7 +82,8 @@ protected:
     }
 
     TemporaryFolder const folder;
-    PowerFailureModel const model;
+    TemporaryFolder const sources;
+    PowerFailureModel model;
     std::vector<DiskEvent> events;
 
     Write const transaction = [this](LocalProvider& provider, std::string const& content) {
@@ -88,12 +91,27 @@ protected:
         stream->write(content.data(), static_cast<long>(content.size()));
         stream->close(StreamClosePolicy::Commit);
     };
+
+    Write const copy = [this](LocalProvider& provider, std::string const& content) {
+        sources.write("source", content);
+        provider.copyFileAtomic(sources.iri(u"source"), folder.iri(u"file"), ReplacementPolicy::Overwrite, {});
+    };
 };
 
 TEST_F(PowerFailure, FindsTheNewContentOnceAFullCommitHasReturned)
 {
     record("full", transaction);
     EXPECT_EQ(countBroken(true), 0);
+}
+
+TEST_F(PowerFailure, FindsTheNewContentOnceAFullAtomicCopyHasReturned)
+{
+    record("full", copy);
+    EXPECT_EQ(countBroken(true), 0);
+    record("file", copy);
+    EXPECT_EQ(countBroken(false), 0);
+    record("none", copy);
+    EXPECT_GT(countBroken(false), 0);
 }
 
 TEST_F(PowerFailure, FindsOldOrNewContentWholeUnderFile)
