@@ -2,6 +2,7 @@
 
 #include <tools/storage/describe.hpp>
 #include <tools/storage/interrupt.hpp>
+#include <tools/storage/scratchName.hpp>
 
 #include <utility>
 
@@ -55,9 +56,11 @@ void TreeCopier::step()
     run_.changeFolder();
 }
 
-/// What a listing calls a folder may be a link to one.
+/// What a listing calls a folder may be a link to one. What somebody is still writing is nobody else's.
 void TreeCopier::copyEntry(FolderLevel const& level, ListedName const& entry)
 {
+    if (entry.isFile && isScratchName(entry.name))
+        return;
     Place source = level.folder().child(entry.name);
     Place target = level.counterpart().child(entry.name);
     if (entry.isFile)

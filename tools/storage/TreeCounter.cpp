@@ -4,6 +4,7 @@
 #include <tools/storage/describe.hpp>
 #include <tools/storage/interrupt.hpp>
 #include <tools/storage/kinds.hpp>
+#include <tools/storage/scratchName.hpp>
 
 #include <exception>
 #include <utility>
@@ -59,6 +60,8 @@ void TreeCounter::countNext(FolderStack& levels)
     if (!level.hasNext())
         return levels.leave();
     ListedName const entry = level.next();
+    if (entry.isFile && isScratchName(entry.name))
+        return; // it is not copied either
     if (entry.isFile)
         return add(entry.size.value_or(0));
     Place child = level.folder().child(entry.name);

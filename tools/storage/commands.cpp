@@ -17,6 +17,7 @@ std::span<Command const> commands()
         Command{"cp", "Copy files and folders, each file whole or not at all", defineCp},
         Command{"mv", "Move or rename files and folders", defineMv},
         Command{"rm", "Remove files and folders", defineRm},
+        Command{"clean", "Remove scratch files that killed writers left in local folders", defineClean},
         Command{"mkdir", "Make folders", defineMkdir},
         Command{"watch", "Tell what happens to files and folders, as it happens", defineWatch},
         Command{"schemes", "List the schemes of the stores that can be reached", defineSchemes},

@@ -7,6 +7,7 @@
 namespace foundation::storage::tool {
 
 Action defineCat(CLI::App& app);
+Action defineClean(CLI::App& app);
 Action defineCompletion(CLI::App& app);
 Action defineCp(CLI::App& app);
 Action defineDu(CLI::App& app);

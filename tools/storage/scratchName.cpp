@@ -10,11 +10,15 @@ namespace foundation::storage::tool {
 namespace {
 
 constexpr std::u16string_view suffix = u".tmp.bak";
-constexpr std::u16string_view uuidForm = u"xxxxxxxx-xxxx-xxxx-xxxx-xxxxxxxxxxxx";
+
+/// `x` is any digit, `v` one of those that say that the UUID is of the usual variant.
+constexpr std::u16string_view uuidForm = u"xxxxxxxx-xxxx-4xxx-vxxx-xxxxxxxxxxxx";
 
 bool fits(char16_t c, char16_t form)
 {
     bool const isDigit = (c >= u'0' && c <= u'9') || (c >= u'a' && c <= u'f');
+    if (form == u'v')
+        return c == u'8' || c == u'9' || c == u'a' || c == u'b';
     return form == u'x' ? isDigit : c == form;
 }
 

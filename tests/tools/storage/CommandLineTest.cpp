@@ -15,15 +15,15 @@ TEST_F(CommandLine, PrintsItsVersion)
 TEST_F(CommandLine, HelpNamesEveryCommand)
 {
     std::string const help = runWell({"--help"});
-    for (std::string const name : {"ls", "tree", "find", "du", "stat", "cat", "put", "cp", "mv", "rm", "mkdir", "watch",
-                                   "schemes", "completion", "man"})
+    for (std::string const name : {"ls", "tree", "find", "du", "stat", "cat", "put", "cp", "mv", "rm", "clean", "mkdir",
+                                   "watch", "schemes", "completion", "man"})
         EXPECT_NE(help.find("\n  " + name + ' '), std::string::npos) << name;
 }
 
 TEST_F(CommandLine, EachCommandHasHelpOfItsOwn)
 {
-    for (std::string const name : {"ls", "tree", "find", "du", "stat", "cat", "put", "cp", "mv", "rm", "mkdir", "watch",
-                                   "schemes", "completion", "man"})
+    for (std::string const name : {"ls", "tree", "find", "du", "stat", "cat", "put", "cp", "mv", "rm", "clean", "mkdir",
+                                   "watch", "schemes", "completion", "man"})
         EXPECT_NE(runWell({name, "--help"}).find("Usage: storage " + name + ' '), std::string::npos) << name;
 }
 
