@@ -193,7 +193,7 @@ TEST_F(Watch, TellsOnceWhatIsWatchedTwice)
 
 TEST_F(Watch, LeavesOutScratchFiles)
 {
-    constexpr char const* scratch = "d/01234567-89ab-cdef-0123-456789abcdef.tmp.bak";
+    constexpr char const* scratch = "d/01234567-89ab-4def-8123-456789abcdef.tmp.bak";
     start({"d"});
     folder.write(scratch, "content");
     rename(scratch, "d/target");
@@ -204,7 +204,7 @@ TEST_F(Watch, LeavesOutScratchFiles)
 
 TEST_F(Watch, TellsOfScratchFilesWhenAsked)
 {
-    std::string const scratch = "d/01234567-89ab-cdef-0123-456789abcdef.tmp.bak";
+    std::string const scratch = "d/01234567-89ab-4def-8123-456789abcdef.tmp.bak";
     start({"--all", "d"});
     folder.write(scratch, "");
     rename(scratch, "d/target");

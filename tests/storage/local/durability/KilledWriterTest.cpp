@@ -16,6 +16,7 @@
 #include <cstdint>
 #include <filesystem>
 #include <random>
+#include <sched.h>
 #include <stdexcept>
 #include <string>
 #include <sys/wait.h>
@@ -34,35 +35,46 @@ using tests::support::TemporaryFolder;
 
 constexpr int kills = 1000;
 
-/// The number of the last content whose commit returned.
-using Acknowledged = std::atomic<std::uint64_t>;
+/// Few bytes at a time, so that writing takes long enough beside a rename that waits for the disk.
+constexpr std::size_t pieceLength = 16;
 
-[[noreturn]] void writeForEver(StorageIRI const& file, Acknowledged& acknowledged)
+/// What a writer tells.
+struct Progress
+{
+    std::atomic<std::uint64_t> acknowledged; ///< the number of the last content whose commit returned
+    std::atomic<bool> hasBegun;
+};
+
+[[noreturn]] void writeForEver(StorageIRI const& file, Progress& progress)
 {
     LocalProvider provider;
     boost::property_tree::ptree settings;
     settings.put("durability", "none"); // What a process leaves behind is not a matter of the disk.
     provider.configure(settings);
-    for (std::uint64_t number = acknowledged.load() + 1;; ++number) {
+    progress.hasBegun = true;
+    for (std::uint64_t number = progress.acknowledged.load() + 1;; ++number) {
         std::string const content = madeContent(number);
         auto const stream = provider.openTransactionalStream(file, {});
         for (std::size_t written = 0; written < content.size();) {
-            long const count = std::min<long>(1000, static_cast<long>(content.size() - written));
+            auto const count = static_cast<long>(std::min(pieceLength, content.size() - written));
             written += static_cast<std::size_t>(stream->write(content.data() + written, count));
         }
         stream->close(StreamClosePolicy::Commit);
-        acknowledged = number;
+        progress.acknowledged = number;
     }
 }
 
-/// Lets a writer run for a moment, and kills it.
-void killAWriter(StorageIRI const& file, Acknowledged& acknowledged, std::chrono::microseconds moment)
+/// Lets a writer run for a moment from its first write on, however late the system starts it, and kills it.
+void killAWriter(StorageIRI const& file, Progress& progress, std::chrono::microseconds moment)
 {
+    progress.hasBegun = false;
     pid_t const writer = ::fork();
     if (writer == 0)
-        writeForEver(file, acknowledged);
+        writeForEver(file, progress);
     if (writer == -1)
         throw std::runtime_error("no process for the writer");
+    while (!progress.hasBegun && ::waitpid(writer, nullptr, WNOHANG) == 0)
+        ::sched_yield();
     timespec const wait{.tv_sec = 0, .tv_nsec = std::chrono::nanoseconds(moment).count()};
     ::clock_nanosleep(CLOCK_MONOTONIC, 0, &wait, nullptr);
     ::kill(writer, SIGKILL);
@@ -75,12 +87,12 @@ TEST(KilledWriter, LeavesOldOrNewContentWholeAndNothingElseButScratchFiles)
 {
     TemporaryFolder const folder;
     folder.write("file", madeContent(0));
-    SharedMemory<Acknowledged> const shared;
-    Acknowledged& acknowledged = *shared;
+    SharedMemory<Progress> const shared;
+    std::atomic<std::uint64_t>& acknowledged = shared->acknowledged;
     std::minstd_rand random(20240229);
     int interrupted = 0;
     for (int i = 0; i < kills; ++i) {
-        killAWriter(folder.iri(u"file"), acknowledged, std::chrono::microseconds(random() % 3000));
+        killAWriter(folder.iri(u"file"), *shared, std::chrono::microseconds(random() % 3000));
         std::uint64_t const found = numberOfContent(folder.read("file"));
         ASSERT_TRUE(found == acknowledged.load() || found == acknowledged.load() + 1)
             << "found " << found << ", acknowledged " << acknowledged.load();
