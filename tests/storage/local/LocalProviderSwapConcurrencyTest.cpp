@@ -209,7 +209,7 @@ protected:
 
     std::vector<std::function<void()>> operations()
     {
-        auto const write = [this](std::unique_ptr<ByteStream> const& stream) { stream->write("written", 7); };
+        auto const write = [](std::unique_ptr<ByteStream> const& stream) { stream->write("written", 7); };
         return {
             [this] { EXPECT_EQ(read(swapped(u"who")), "within"); },
             [this] { EXPECT_EQ(provider.getFileAttributes(swapped(u"who")).getSize(), 6U); },
