@@ -5,6 +5,7 @@
 #include <CLI/Formatter.hpp>
 #include <algorithm>
 #include <charconv>
+#include <fmt/format.h>
 #include <stdexcept>
 #include <string_view>
 #include <system_error>
@@ -144,14 +145,24 @@ void addValues(CLI::App& app, std::string const& name, std::string const& valueN
         ->allow_extra_args(false);
 }
 
-void addNumber(CLI::App& app, std::string const& name, std::string const& valueName, std::string const& description,
-               std::optional<std::size_t>& value)
+void addHumanReadable(CLI::App& app, bool& value, std::string const& description)
 {
-    addValues(app, name, valueName, description, [&value](std::string const& text) {
+    // A copy: the flag that has it goes first.
+    std::string const help = app.get_help_ptr()->get_description();
+    app.set_help_flag("--help", help);
+    addFlag(app, "-h,-H,--human-readable", value, description);
+}
+
+void addNumber(CLI::App& app, std::string const& name, std::string const& valueName, std::string const& description,
+               std::optional<std::size_t>& value, NumberRange const& range)
+{
+    addValues(app, name, valueName, description, [&value, range](std::string const& text) {
         std::size_t number = 0;
         auto const [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
         if (error != std::errc() || end != text.data() + text.size())
             throw std::invalid_argument('\'' + text + "' is no whole number");
+        if (number < range.least || number > range.most)
+            throw std::invalid_argument(fmt::format("{} is not from {} to {}", number, range.least, range.most));
         value = number;
     });
 }

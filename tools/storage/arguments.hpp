@@ -1,6 +1,7 @@
 #pragma once
 
 #include <functional>
+#include <limits>
 #include <memory>
 #include <optional>
 #include <string>
@@ -57,9 +58,19 @@ void addValues(CLI::App& app, std::string const& name, std::string const& valueN
 void addChoices(CLI::App& app, std::string const& name, std::string const& description,
                 std::vector<std::string> const& choices, std::vector<std::string>& values);
 
-/// Declares an option whose value is a whole number.
+/// Declares the flag that prints sizes for people. With it `-h` means what it means to `ls` and `du` everywhere, and
+/// help is `--help` alone.
+void addHumanReadable(CLI::App& app, bool& value, std::string const& description);
+
+struct NumberRange
+{
+    std::size_t least = 0;
+    std::size_t most = std::numeric_limits<std::size_t>::max();
+};
+
+/// Declares an option whose value is a whole number within a range.
 void addNumber(CLI::App& app, std::string const& name, std::string const& valueName, std::string const& description,
-               std::optional<std::size_t>& value);
+               std::optional<std::size_t>& value, NumberRange const& range = {});
 
 /// Declares an option whose value is one of a few words.
 void addChoice(CLI::App& app, std::string const& name, std::string const& description,

@@ -21,7 +21,7 @@ void addTransferOptions(CLI::App& app, std::string const& verbosity, TransferOpt
             "Say each second how far it is, also where standard error is no terminal");
     addSyncFlag(app, options.isSynced);
     addNumber(app, "-j,--jobs", "N", "Copy so many files at once; otherwise as many as there are processors",
-              options.jobs);
+              options.jobs, {.least = 1, .most = maximumJobs});
 }
 
 Telling tellingOf(TransferOptions const& options)

@@ -190,7 +190,7 @@ Action defineDu(CLI::App& app)
     addNumber(app, "-d,--max-depth", "N", "Print lines for folders down to this depth; all count",
               options->maximumDepth);
     addFlag(app, "-c,--total", options->hasTotal, "Print a total at the end");
-    addFlag(app, "-H,--human-readable", options->isHumanReadable, "Print sizes as 1.5 KiB, 23 MiB; otherwise in bytes");
+    addHumanReadable(app, options->isHumanReadable, "Print sizes as 1.5 KiB, 23 MiB; otherwise in bytes");
     addFlag(app, "--json", options->isJSON, "Print one JSON object a line");
     addOperands(app, "[PATH...]", "Folders and files to sum up; the working folder when there are none", 0,
                 options->paths);

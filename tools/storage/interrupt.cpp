@@ -11,7 +11,7 @@ namespace foundation::storage::tool {
 namespace {
 
 constexpr int patience = 3;
-constexpr int caughtSignals[]{SIGINT, SIGTERM, SIGHUP};
+constexpr int caughtSignals[]{SIGINT, SIGTERM, SIGHUP, SIGQUIT};
 
 std::atomic<int> pendingSignal = 0;
 std::atomic<int> signalCount = 0;

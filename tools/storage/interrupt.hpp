@@ -13,8 +13,8 @@ struct Interrupted
     bool leavesWork = false; ///< a thread is still at work, which nobody can stop
 };
 
-/// Makes SIGINT, SIGTERM and SIGHUP requests to stop, which work looks for between two steps. The third one ends the
-/// program at once, for when a step does not end. A signal that was ignored stays so.
+/// Makes SIGINT, SIGTERM, SIGHUP and SIGQUIT requests to stop, which work looks for between two steps. The third one
+/// ends the program at once, for when a step does not end. A signal that was ignored stays so.
 void catchInterrupts();
 
 /// Throws `Interrupted` when the user asked to stop.

@@ -160,7 +160,7 @@ Action defineLs(CLI::App& app)
 {
     auto const options = std::make_shared<Options>();
     addFlag(app, "-l,--long", options->isLong, "Also print type, size in bytes and time of the last change (UTC)");
-    addFlag(app, "-H,--human-readable", options->isHumanReadable, "With -l, print sizes as 1.5 KiB, 23 MiB");
+    addHumanReadable(app, options->isHumanReadable, "With -l, print sizes as 1.5 KiB, 23 MiB");
     addFlag(app, "-a,--all", options->isAll, "Also list scratch files, of writes that are not finished");
     addFlag(app, "-1", options->isOnePerLine, "One name a line; this is always so");
     addFlag(app, "--json", options->isJSON, "Print one JSON object a line for each entry");

@@ -41,8 +41,8 @@ Something failed; every failure was reported, the rest was done.
 .B 2
 The command line was wrong; nothing was done.
 .TP
-.BR 130 ", " 143 ", " 129
-Interrupted (Ctrl-C, SIGTERM, SIGHUP); what was half written was removed.
+.BR 130 ", " 143 ", " 129 ", " 131
+Interrupted (Ctrl-C, SIGTERM, SIGHUP, SIGQUIT); what was half written was removed.
 )";
 
 /// What these characters are to be in the text; roff takes them for something else.

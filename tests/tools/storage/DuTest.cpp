@@ -113,7 +113,8 @@ TEST_F(Du, CountsTheSizeOfFilesAndNotOfTheirBlocks)
     makeFolder("a");
     folder.write("a/f", "");
     std::filesystem::resize_file(folder / "a/f", std::uintmax_t{3} << 40U);
-    EXPECT_EQ(sums({"-H", "a"}), (Sums{{"a", "3.0 TiB"}}));
+    for (char const* const option : {"-h", "-H", "--human-readable"})
+        EXPECT_EQ(sums({option, "a"}), (Sums{{"a", "3.0 TiB"}}));
     EXPECT_EQ(sums({"a"}), (Sums{{"a", "3298534883328"}}));
 }
 

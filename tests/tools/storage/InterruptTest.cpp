@@ -89,10 +89,12 @@ TEST_F(Interrupt, TellsWhatWasDoneBefore)
 TEST_F(Interrupt, LeavesTheOldFile)
 {
     folder.write("t/big", "old");
-    ProgramResult const result = interrupt({"cp", "--replace", "big", "t"}, SIGTERM);
-    EXPECT_EQ(result.status, 143);
-    EXPECT_EQ(folder.read("t/big"), "old");
-    EXPECT_EQ(countEntries("t"), 1U);
+    for (int const signal : {SIGTERM, SIGQUIT}) {
+        ProgramResult const result = interrupt({"cp", "--replace", "big", "t"}, signal);
+        EXPECT_EQ(result.status, 128 + signal);
+        EXPECT_EQ(folder.read("t/big"), "old");
+        EXPECT_EQ(countEntries("t"), 1U);
+    }
 }
 
 TEST_F(Interrupt, EndsARecursiveCopy)

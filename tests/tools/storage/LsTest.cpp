@@ -84,6 +84,19 @@ TEST_F(Ls, LongFormTellsTypeSizeAndTime)
                                                     "folder                     -  1970-01-01T00:00:00Z  b\n");
 }
 
+TEST_F(Ls, LongFormTellsSizesForPeople)
+{
+    folder.write("a", std::string(1536, 'x'));
+    setTime("a", 1709210096);
+    for (char const* const options : {"-lh", "-lH"})
+        EXPECT_EQ(runWell({"ls", options}), "file                 1.5 KiB  2024-02-29T12:34:56Z  a\n");
+}
+
+TEST_F(Ls, HelpsOnlyWhenToldInFull)
+{
+    EXPECT_NE(runWell({"ls", "--help"}).find("--human-readable"), std::string::npos);
+}
+
 TEST_F(Ls, LongFormTellsLinksAndSpecialFilesApart)
 {
     folder.write("a", "12345");
