@@ -100,7 +100,8 @@ private:
     void enter(Place const& folder, std::string indentation);
     void lookAhead();
     void drawNext();
-    void drawEntry(Place const& place, bool isFile, bool isLast);
+    void drawFile(ListedName const& entry, bool isLast);
+    void drawFolder(ListedName const& entry, bool isLast);
     void drawLine(char const* stroke, std::u16string const& name, char const* remark);
 
     Session& session_;
@@ -156,20 +157,30 @@ void Drawing::drawNext()
         branches_.pop_back();
         return;
     }
-    ListedName const entry = *branches_.back().next;
-    Place const place = levels_.innermost().folder().child(entry.name);
+    ListedName const entry = std::move(*branches_.back().next);
     session_.attempt([&] { lookAhead(); });
-    drawEntry(place, entry.isFile, !branches_.back().next.has_value());
+    bool const isLast = !branches_.back().next.has_value();
+    if (entry.isFile)
+        drawFile(entry, isLast);
+    else
+        drawFolder(entry, isLast);
 }
 
-void Drawing::drawEntry(Place const& place, bool isFile, bool isLast)
+/// Needs no location of its own: making one costs more than all the rest.
+void Drawing::drawFile(ListedName const& entry, bool isLast)
 {
-    char const* const stroke = isLast ? strokes_.lastBranch : strokes_.branch;
-    std::u16string const name = place.item().getName();
-    bool const isLinkToFolder = !isFile && kindOf(place) == Kind::SymlinkToFolder;
-    drawLine(stroke, name, isLinkToFolder ? " (a link to a folder, not followed)" : "");
-    ++(isFile ? files_ : folders_);
-    if (!isFile && !isLinkToFolder)
+    drawLine(isLast ? strokes_.lastBranch : strokes_.branch, entry.name, "");
+    ++files_;
+}
+
+void Drawing::drawFolder(ListedName const& entry, bool isLast)
+{
+    Place const place = levels_.innermost().folder().child(entry.name);
+    bool const isLink = kindOf(place) == Kind::SymlinkToFolder;
+    drawLine(isLast ? strokes_.lastBranch : strokes_.branch, entry.name,
+             isLink ? " (a link to a folder, not followed)" : "");
+    ++folders_;
+    if (!isLink)
         enter(place, branches_.back().indentation + (isLast ? strokes_.space : strokes_.trunk));
 }
 
