@@ -26,6 +26,7 @@
 #include <storage/provider/InterruptSignal.hpp>
 #include <storage/provider/PathView.hpp>
 #include <storage/provider/PhysicalProviderFactory.hpp>
+#include <storage/provider/ReasonInfo.hpp>
 #include <storage/provider/ReplacementPolicy.hpp>
 #include <storage/provider/StorageIRI.hpp>
 #include <storage/provider/StorageItem.hpp>

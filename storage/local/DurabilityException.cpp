@@ -1,6 +1,7 @@
 #include <storage/local/DurabilityException.hpp>
 
 #include <fl/i18n/convert.hpp>
+#include <storage/provider/ReasonInfo.hpp>
 
 namespace foundation::storage::local {
 
@@ -10,10 +11,14 @@ namespace {
 
 constexpr char const* className = "foundation::storage::local::DurabilityException";
 constexpr char16_t const* meaning = u"The new content is in place, but it is not certain to survive a power failure.";
+constexpr char16_t const* reason = u"the new content is in place, but it is not certain to survive a power failure";
 
 } // namespace
 
-DurabilityException::DurabilityException(ErrorCode const& code, StorageIRI const& target) : Exception(code, target) {}
+DurabilityException::DurabilityException(ErrorCode const& code, StorageIRI const& target) : Exception(code, target)
+{
+    *this << ReasonInfo(reason);
+}
 
 core::except::IException* DurabilityException::clone() const
 {

@@ -13,7 +13,8 @@ namespace foundation::storage::local {
 /// Neither success nor "nothing happened": what was replaced is gone. A transactional stream that was closed in vain
 /// can be closed again, which repeats that step alone; aborting it removes nothing.
 ///
-/// `what` is the class name alone; `ToUstringImpl` names location and code and says the above.
+/// `what` is the class name alone; `ToUstringImpl` names location and code and says the above, as its `ReasonInfo`
+/// does.
 class FOUNDATION_API DurabilityException : public provider::Exception
 {
 public:

@@ -8,6 +8,7 @@
 #include <storage/registry/registerAll.hpp>
 #include <tools/storage/Failure.hpp>
 #include <tools/storage/describe.hpp>
+#include <tools/storage/explain.hpp>
 
 #include <boost/property_tree/ptree.hpp>
 #include <cerrno>
@@ -80,7 +81,7 @@ std::string explain(provider::Exception const& error, std::string const& argumen
     bool const isInvalid = error.getErrorCode() == provider::ErrorCode::InvalidLocation;
     if (isInvalid && argument.find_first_of("?#") != std::string::npos)
         return "a '?' or '#' that belongs to a name is written %3F or %23";
-    return describe(error.getErrorCode());
+    return tool::explain(error);
 }
 
 boost::property_tree::ptree localDurability(char const* durability)

@@ -3,6 +3,7 @@
 #include <storage/provider/ByteStreamFailure.hpp>
 #include <storage/provider/ChangeEventExceptions.hpp>
 #include <storage/provider/Exception.hpp>
+#include <tools/storage/explain.hpp>
 
 #include <exception>
 #include <new>
@@ -48,7 +49,7 @@ void rethrowAsFailure(Place const& place)
     try {
         throw;
     } catch (provider::Exception const& error) {
-        throw Failure{place.text(), describe(error.getErrorCode())};
+        throw Failure{place.text(), explain(error)};
     } catch (provider::ByteStreamFailure const& error) {
         throw Failure{place.text(), describe(error.getErrorCode())};
     } catch (provider::ChangeEventsNotSupportedException const&) {

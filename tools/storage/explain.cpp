@@ -1,0 +1,18 @@
+#include <tools/storage/explain.hpp>
+
+#include <fl/i18n/utf8.hpp>
+#include <storage/provider/ReasonInfo.hpp>
+#include <tools/storage/describe.hpp>
+
+#include <boost/exception/get_error_info.hpp>
+
+namespace foundation::storage::tool {
+
+std::string explain(provider::Exception const& error)
+{
+    if (auto const* const reason = boost::get_error_info<provider::ReasonInfo>(error))
+        return fl::i18n::to_utf8(*reason, fl::i18n::Malformed::Replace);
+    return describe(error.getErrorCode());
+}
+
+} // namespace foundation::storage::tool

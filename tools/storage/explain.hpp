@@ -1,0 +1,12 @@
+#pragma once
+
+#include <storage/provider/Exception.hpp>
+
+#include <string>
+
+namespace foundation::storage::tool {
+
+/// What happened, in plain words: those that the failure carries, if any, else those for its code.
+std::string explain(provider::Exception const& error);
+
+} // namespace foundation::storage::tool
