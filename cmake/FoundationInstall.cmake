@@ -52,6 +52,7 @@ write_basic_package_version_file(
 install(FILES
     "${PROJECT_BINARY_DIR}/foundation_storage-config.cmake"
     "${PROJECT_BINARY_DIR}/foundation_storage-config-version.cmake"
+    "${CMAKE_CURRENT_LIST_DIR}/FindLibZip.cmake"
     "${CMAKE_CURRENT_LIST_DIR}/FindPCRE2.cmake"
     DESTINATION "${package_dir}")
 

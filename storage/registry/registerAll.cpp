@@ -3,12 +3,32 @@
 #include <storage/local/LocalProviderFactory.hpp>
 #include <storage/memory/MemoryProviderFactory.hpp>
 
+#ifdef FOUNDATION_STORAGE_HAS_ARCHIVE
+#include <storage/archive/ArchiveProviderFactory.hpp>
+#endif
+
 namespace foundation::storage::registry {
+
+namespace {
+
+#ifdef FOUNDATION_STORAGE_HAS_ARCHIVE
+void registerArchives(Registry& registry)
+{
+    using archive::ArchiveFormat;
+    using archive::ArchiveProviderFactory;
+    registry.add(u"zip", std::make_shared<ArchiveProviderFactory>(ArchiveFormat::Zip));
+}
+#else
+void registerArchives(Registry& /*registry*/) {}
+#endif
+
+} // namespace
 
 void registerAll(Registry& registry)
 {
     registry.add(u"file", std::make_shared<local::LocalProviderFactory>());
     registry.add(u"mem", std::make_shared<memory::MemoryProviderFactory>());
+    registerArchives(registry);
 }
 
 } // namespace foundation::storage::registry

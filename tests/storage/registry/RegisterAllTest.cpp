@@ -16,9 +16,23 @@ TEST(RegisterAll, AddsWhatIsBuiltIn)
 {
     Registry registry;
     registerAll(registry);
-    EXPECT_EQ(registry.schemes(), (std::vector<Scheme>{{u"file", SchemeKind::Physical}, //
-                                                       {u"mem", SchemeKind::Physical}}));
+    std::vector<Scheme> expected{{u"file", SchemeKind::Physical}, {u"mem", SchemeKind::Physical}};
+#ifdef FOUNDATION_STORAGE_HAS_ARCHIVE
+    expected.push_back({u"zip", SchemeKind::Container});
+#endif
+    EXPECT_EQ(registry.schemes(), expected);
 }
+
+#ifdef FOUNDATION_STORAGE_HAS_ARCHIVE
+TEST(RegisterAll, OpensPlacesInArchives)
+{
+    TemporaryFolder const folder;
+    folder.write("a.zip", std::string("PK\x05\x06", 4) + std::string(18, '\0'));
+    Registry registry;
+    registerAll(registry);
+    EXPECT_TRUE(registry.open(provider::StorageIRI(u"zip", folder.iri(u"a.zip"), u"/")).folderExists());
+}
+#endif
 
 TEST(RegisterAll, OpensLocalFiles)
 {

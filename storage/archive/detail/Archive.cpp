@@ -1,0 +1,32 @@
+#include <storage/archive/detail/Archive.hpp>
+
+#include <storage/archive/detail/Fault.hpp>
+#include <storage/archive/detail/Source.hpp>
+#include <storage/archive/detail/ZipArchive.hpp>
+#include <storage/archive/detail/time.hpp>
+
+namespace foundation::storage::archive::detail {
+
+using Reason = ArchiveException::Reason;
+
+std::shared_ptr<Archive const> openArchive(ArchiveFormat format, provider::StorageItem const& container,
+                                           ArchiveLimits const& limits)
+{
+    std::int64_t const modified = toMicroseconds(container.getFileAttributes().getLastModified());
+    std::shared_ptr<Source const> const source = openSource(container, limits);
+    switch (format) {
+    case ArchiveFormat::Zip:
+        return std::make_shared<ZipArchive>(source, limits, modified);
+    }
+    throw Fault(Reason::UnsupportedMethod);
+}
+
+void requireWithinLimits(ArchiveLimits const& limits, std::uint64_t size, std::uint64_t sizeInArchive)
+{
+    if (size > limits.entryBytes)
+        throw Fault(Reason::EntryTooLarge);
+    if (size > limits.bytesOfAnyRatio && size / limits.ratio > sizeInArchive)
+        throw Fault(Reason::RatioTooHigh);
+}
+
+} // namespace foundation::storage::archive::detail

@@ -1,0 +1,226 @@
+#include <storage/archive/detail/MountedArchive.hpp>
+
+#include <storage/archive/detail/EntryStream.hpp>
+#include <storage/archive/detail/Fault.hpp>
+#include <storage/archive/detail/Source.hpp>
+#include <storage/archive/detail/entryName.hpp>
+#include <storage/provider/Exception.hpp>
+
+#include <string>
+#include <utility>
+
+namespace foundation::storage::archive::detail {
+
+using namespace provider;
+using LastLink = Index::LastLink;
+using Reason = ArchiveException::Reason;
+
+namespace {
+
+/// How many containers lie round a place in `container`, which is one of them.
+unsigned depthInside(StorageIRI container)
+{
+    unsigned depth = 1;
+    for (; container.hasInnerIRI(); container = container.getInnerIRI())
+        ++depth;
+    return depth;
+}
+
+std::u16string canonicalPath(std::u16string_view path)
+{
+    std::u16string canonical;
+    for (std::u16string_view name = takeName(path); !name.empty(); name = takeName(path)) {
+        if (name == u"..")
+            canonical.resize(canonical.empty() ? 0 : canonical.rfind(u'/'));
+        else if (name != u".")
+            canonical.append(1, u'/').append(name);
+    }
+    return canonical.empty() ? u"/" : canonical;
+}
+
+ExistenceTypeExtended typeOfTarget(Index const& index, Index::Id link)
+{
+    Index::Place const target = index.follow(link);
+    if (!target.id || index.at(*target.id).kind == EntryKind::HardLink)
+        return ExistenceTypeExtended::BrokenSymlink;
+    return index.at(*target.id).kind == EntryKind::Folder ? ExistenceTypeExtended::SymlinkToFolder
+                                                          : ExistenceTypeExtended::SymlinkToFile;
+}
+
+} // namespace
+
+MountedArchive::MountedArchive(ArchiveFormat format, StorageItem container, ArchiveLimits const& limits)
+    : format_(format), container_(std::move(container)), location_(container_.getLocation()), limits_(limits)
+{
+    if (depthInside(location_) > limits.nesting)
+        throw ArchiveException(Reason::NestedTooDeep, location_);
+}
+
+void MountedArchive::requireInside(StorageIRI const& iri) const
+{
+    if (!iri.hasInnerIRI())
+        throw Exception(ErrorCode::InvalidLocation, iri);
+    StorageIRI const container = iri.getInnerIRI();
+    if (container != location_ && container.getResolvedIRI() != location_.getResolvedIRI())
+        throw Exception(ErrorCode::InvalidLocation, iri);
+}
+
+MountedArchive::Stamp MountedArchive::stampOfContainer() const
+{
+    FileAttributes const attributes = container_.getFileAttributes();
+    return {attributes.getSize(), attributes.getLastModified()};
+}
+
+MountedArchive::ArchivePtr MountedArchive::archive() const
+{
+    std::lock_guard const lock(mutex_);
+    return archive_ != nullptr ? archive_ : openLocked(stampOfContainer());
+}
+
+MountedArchive::ArchivePtr MountedArchive::upToDateArchive() const
+{
+    std::lock_guard const lock(mutex_);
+    Stamp const stamp = stampOfContainer();
+    return archive_ != nullptr && stamp_ == stamp ? archive_ : openLocked(stamp);
+}
+
+/// Nothing where the container is not there.
+MountedArchive::ArchivePtr MountedArchive::existingArchive() const
+{
+    try {
+        return archive();
+    } catch (Exception const& error) {
+        if (error.getErrorCode() != ErrorCode::ResourceNotFound)
+            throw;
+        return nullptr;
+    }
+}
+
+MountedArchive::ArchivePtr const& MountedArchive::openLocked(Stamp const& stamp) const
+{
+    archive_.reset();
+    archive_ = at(location_, [&] { return openArchive(format_, container_, limits_); });
+    stamp_ = stamp;
+    return archive_;
+}
+
+void MountedArchive::release()
+{
+    ArchivePtr gone; // goes unlocked
+    std::lock_guard const lock(mutex_);
+    gone = std::move(archive_);
+}
+
+Index::Id MountedArchive::require(Archive const& archive, StorageIRI const& iri) const
+{
+    Index::Place const place = archive.index().find(iri.getPath(), LastLink::Follow);
+    if (place.isLoop)
+        throw Exception(ErrorCode::InvalidLocation, iri);
+    if (!place.id || archive.index().at(*place.id).kind == EntryKind::HardLink)
+        throw Exception(ErrorCode::ResourceNotFound, iri);
+    return *place.id;
+}
+
+Index::Id MountedArchive::requireFile(Archive const& archive, StorageIRI const& iri) const
+{
+    Index::Id const id = require(archive, iri);
+    if (archive.index().at(id).kind == EntryKind::Folder)
+        throw Exception(ErrorCode::ResourceNotFound, iri);
+    return id;
+}
+
+Index::Id MountedArchive::requireFolder(Archive const& archive, StorageIRI const& iri) const
+{
+    Index::Id const id = require(archive, iri);
+    if (archive.index().at(id).kind != EntryKind::Folder)
+        throw Exception(ErrorCode::ResourceNotFound, iri);
+    return id;
+}
+
+ExistenceType MountedArchive::exists(StorageIRI const& iri) const
+{
+    requireInside(iri);
+    ArchivePtr const archive = existingArchive();
+    if (archive == nullptr)
+        return ExistenceType::AsNeither;
+    auto const id = archive->index().find(iri.getPath(), LastLink::Follow).id;
+    if (!id || archive->index().at(*id).kind == EntryKind::HardLink)
+        return ExistenceType::AsNeither;
+    return archive->index().at(*id).kind == EntryKind::Folder ? ExistenceType::AsFolder : ExistenceType::AsFile;
+}
+
+ExistenceTypeExtended MountedArchive::existsExtended(StorageIRI const& iri) const
+{
+    requireInside(iri);
+    ArchivePtr const archive = existingArchive();
+    if (archive == nullptr)
+        return ExistenceTypeExtended::None;
+    auto const id = archive->index().find(iri.getPath(), LastLink::Keep).id;
+    if (!id)
+        return ExistenceTypeExtended::None;
+    switch (archive->index().at(*id).kind) {
+    case EntryKind::Folder:
+        return ExistenceTypeExtended::RegularFolder;
+    case EntryKind::File:
+        return ExistenceTypeExtended::RegularFile;
+    case EntryKind::Special:
+        return ExistenceTypeExtended::SpecialFile;
+    case EntryKind::SymbolicLink:
+        return typeOfTarget(archive->index(), *id);
+    case EntryKind::HardLink:
+        break;
+    }
+    return ExistenceTypeExtended::BrokenSymlink;
+}
+
+FileAttributes MountedArchive::fileAttributes(StorageIRI const& iri) const
+{
+    requireInside(iri);
+    ArchivePtr const archive = this->archive();
+    return detail::fileAttributes(archive->index().at(requireFile(*archive, iri)));
+}
+
+FolderAttributes MountedArchive::folderAttributes(StorageIRI const& iri) const
+{
+    requireInside(iri);
+    ArchivePtr const archive = this->archive();
+    return detail::folderAttributes(archive->index().at(requireFolder(*archive, iri)));
+}
+
+ExtendedAttributes MountedArchive::extendedAttributes(StorageIRI const& iri) const
+{
+    requireInside(iri);
+    ArchivePtr const archive = this->archive();
+    Index::Id const id = require(*archive, iri);
+    if (archive->index().at(id).kind != EntryKind::File)
+        return {};
+    std::string const access = archive->isRandomAccess(id) ? randomAccess : sequentialAccess;
+    return ExtendedAttributes({{accessAttribute, access}});
+}
+
+std::unique_ptr<ByteStream> MountedArchive::open(StorageIRI const& iri) const
+{
+    requireInside(iri);
+    ArchivePtr const archive = this->archive();
+    Index::Id const id = requireFile(*archive, iri);
+    Node const& node = archive->index().at(id);
+    if (node.kind != EntryKind::File)
+        throw Exception(ErrorCode::UnsupportedOperation, iri);
+    return at(iri, [&] { return std::make_unique<EntryStream>(iri, archive->open(id), node.size); });
+}
+
+IProvider::Listing MountedArchive::list(StorageIRI const& folder, Selection selection) const
+{
+    requireInside(folder);
+    ArchivePtr archive = upToDateArchive();
+    Index::Id const id = requireFolder(*archive, folder);
+    return std::make_unique<ArchiveListing>(std::move(archive), id, std::move(selection));
+}
+
+StorageIRI MountedArchive::canonicalLocation(StorageIRI const& iri) const
+{
+    requireInside(iri);
+    return StorageIRI(iri.getScheme(), location_, canonicalPath(iri.getPath()));
+}
+
+} // namespace foundation::storage::archive::detail

@@ -1,0 +1,75 @@
+#pragma once
+
+#include <foundation/export.hpp>
+#include <storage/archive/ArchiveFormat.hpp>
+#include <storage/archive/ArchiveLimits.hpp>
+#include <storage/archive/detail/Archive.hpp>
+#include <storage/archive/detail/ArchiveListing.hpp>
+#include <storage/provider/ByteStream.hpp>
+#include <storage/provider/ExistenceType.hpp>
+#include <storage/provider/ExtendedAttributes.hpp>
+#include <storage/provider/IProvider.hpp>
+#include <storage/provider/StorageItem.hpp>
+
+#include <memory>
+#include <mutex>
+#include <optional>
+
+namespace foundation::storage::archive::detail {
+
+/// The locations in one container, and what is there.
+///
+/// The index is read when it is first needed, and again when a listing begins and the container has changed since.
+/// Errors: `Exception` that names the container where that is at fault, else the location.
+/// Threads: any number at once; while one reads the index, others wait for it.
+class FOUNDATION_API MountedArchive
+{
+public:
+    MountedArchive(ArchiveFormat format, provider::StorageItem container, ArchiveLimits const& limits);
+
+    /// Without a container there is nothing.
+    provider::ExistenceType exists(provider::StorageIRI const& iri) const;
+    provider::ExistenceTypeExtended existsExtended(provider::StorageIRI const& iri) const;
+
+    provider::FileAttributes fileAttributes(provider::StorageIRI const& iri) const;
+    provider::FolderAttributes folderAttributes(provider::StorageIRI const& iri) const;
+    provider::ExtendedAttributes extendedAttributes(provider::StorageIRI const& iri) const;
+    std::unique_ptr<provider::ByteStream> open(provider::StorageIRI const& iri) const;
+    provider::IProvider::Listing list(provider::StorageIRI const& folder, Selection selection) const;
+    provider::StorageIRI canonicalLocation(provider::StorageIRI const& iri) const;
+
+    /// Lets go of the archive, until it is used again. Streams and listings keep what they have.
+    void release();
+
+private:
+    using ArchivePtr = std::shared_ptr<Archive const>;
+
+    /// What tells a container from a changed one.
+    struct Stamp
+    {
+        std::uint64_t size;
+        boost::posix_time::ptime modified;
+
+        bool operator==(Stamp const&) const = default;
+    };
+
+    void requireInside(provider::StorageIRI const& iri) const;
+    Stamp stampOfContainer() const;
+    ArchivePtr archive() const;
+    ArchivePtr upToDateArchive() const;
+    ArchivePtr existingArchive() const;
+    ArchivePtr const& openLocked(Stamp const& stamp) const;
+    Index::Id require(Archive const& archive, provider::StorageIRI const& iri) const;
+    Index::Id requireFile(Archive const& archive, provider::StorageIRI const& iri) const;
+    Index::Id requireFolder(Archive const& archive, provider::StorageIRI const& iri) const;
+
+    ArchiveFormat const format_;
+    provider::StorageItem const container_;
+    provider::StorageIRI const location_; ///< of the container
+    ArchiveLimits const limits_;
+    mutable std::mutex mutex_;
+    mutable ArchivePtr archive_;
+    mutable std::optional<Stamp> stamp_;
+};
+
+} // namespace foundation::storage::archive::detail
