@@ -68,15 +68,26 @@ Located locate(Root const& root, std::string const& path, StorageIRI const& iri)
     return entry;
 }
 
+/// Nothing is to be synced of what is missing, a link or a socket; the move tells whether that matters.
+int syncContent(Root const& root, std::string const& path)
+{
+    constexpr int flags = O_NOFOLLOW | O_NOCTTY | O_NONBLOCK;
+    FileDescriptor file;
+    int error = root.open(path, O_RDONLY | flags, file);
+    if (error == EACCES)
+        error = root.open(path, O_WRONLY | flags, file);
+    if (error == 0)
+        return sync(file, file);
+    return meansMissing(error) || error == ELOOP || error == ENXIO ? 0 : error;
+}
+
 /// Who writes to a scratch file and moves it to its place relies on it as on a transaction.
 void syncScratchFile(Settings const& settings, StorageIRI const& from)
 {
     std::string const path = settings.root.pathOf(from);
-    FileDescriptor file;
-    if (settings.durability == Durability::None || !isScratchName(path.substr(path.rfind('/') + 1)) ||
-        settings.root.open(path, O_RDONLY | O_NOFOLLOW | O_NOCTTY | O_NONBLOCK, file) != 0)
+    if (settings.durability == Durability::None || !isScratchName(path.substr(path.rfind('/') + 1)))
         return;
-    if (int const error = sync(file, file))
+    if (int const error = syncContent(settings.root, path))
         throwError(error, from);
 }
 

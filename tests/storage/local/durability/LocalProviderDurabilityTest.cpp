@@ -9,6 +9,7 @@
 
 #include <boost/property_tree/ptree.hpp>
 
+#include <fcntl.h>
 #include <filesystem>
 #include <memory>
 #include <string>
@@ -159,6 +160,37 @@ TEST_F(LocalProviderDurability, SyncsAScratchFileThatItsWriterMovesToItsPlace)
 {
     folder.write("7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak", "new");
     RecordedSystemCalls const record;
+    provider.moveFile(at(u"7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak"), at(u"new"), ReplacementPolicy::NoClobber);
+    EXPECT_EQ(record.told(), (Told{"sync scratch", "rename scratch to new", "sync " + folderName()}));
+}
+
+TEST_F(LocalProviderDurability, MovesNoScratchFileThatCannotBeSynced)
+{
+    std::string const name = "7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak";
+    StorageIRI const scratch = at(std::u16string(name.begin(), name.end()));
+    folder.write(name, "new");
+    ReplacedSystemCalls replaced;
+    for (auto const& [error, code] :
+         {std::pair(EMFILE, ErrorCode::ResourceInUse), {EACCES, ErrorCode::PermissionDenied}}) {
+        static int refusal;
+        refusal = error;
+        replaced->openat = [](int, char const*, int, mode_t) { return failWith(refusal); };
+        EXPECT_EQ(failureOf([&] { provider.moveFile(scratch, at(u"new"), ReplacementPolicy::NoClobber); }),
+                  failure(code, scratch));
+        EXPECT_FALSE(fs::exists(folder / "new"));
+    }
+}
+
+TEST_F(LocalProviderDurability, SyncsAScratchFileThatMayOnlyBeWritten)
+{
+    folder.write("7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak", "new");
+    RecordedSystemCalls record;
+    static decltype(record->openat) open;
+    open = record->openat;
+    record->openat = [](int at, char const* path, int flags, mode_t mode) {
+        bool const reads = (flags & (O_ACCMODE | O_PATH | O_DIRECTORY)) == O_RDONLY;
+        return reads ? failWith(EACCES) : open(at, path, flags, mode);
+    };
     provider.moveFile(at(u"7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak"), at(u"new"), ReplacementPolicy::NoClobber);
     EXPECT_EQ(record.told(), (Told{"sync scratch", "rename scratch to new", "sync " + folderName()}));
 }

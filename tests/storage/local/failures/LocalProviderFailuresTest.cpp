@@ -133,15 +133,13 @@ bool blames(Operation const& operation, SystemCall const& call, std::string cons
 }
 
 /// What a failed removal of a scratch file leaves is no fault of the operation.
-Tree withoutScratch(Tree tree)
+Tree withoutScratchOf(SystemCall const& call, Tree tree)
 {
-    std::erase_if(tree, [](auto const& entry) { return isScratch(entry.first); });
+    if (call.name == "unlinkat")
+        std::erase_if(tree, [&](auto const& entry) {
+            return isScratch(entry.first) && std::count(call.paths.begin(), call.paths.end(), entry.first) != 0;
+        });
     return tree;
-}
-
-bool removesScratch(SystemCall const& call)
-{
-    return call.name == "unlinkat" && std::any_of(call.paths.begin(), call.paths.end(), isScratch);
 }
 
 std::string textOf(Tree const& tree)
@@ -167,7 +165,7 @@ TEST_P(LocalProviderFailures, AreReportedAndLeaveNothingBehind)
             SystemCall const& call = ending.calls[planned.number - 1];
             SCOPED_TRACE(describe(call, error));
             EXPECT_EQ(ending.leakedDescriptors, 0u);
-            Tree const tree = removesScratch(call) ? withoutScratch(ending.tree) : ending.tree;
+            Tree const tree = withoutScratchOf(call, ending.tree);
             if (!ending.code) {
                 Ignored const ignored = isIgnored(operation().name, call, error);
                 EXPECT_TRUE(ignored != Ignored::No) << "nothing was reported";

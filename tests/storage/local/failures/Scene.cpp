@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <filesystem>
 #include <iterator>
+#include <sstream>
 #include <unistd.h>
 
 namespace foundation::tests::support {
@@ -17,7 +18,11 @@ std::string contentOf(fs::directory_entry const& entry, TemporaryFolder const& f
 {
     if (entry.is_symlink())
         return "-> " + fs::read_symlink(entry.path()).native();
-    return entry.is_directory() ? "/" : folder.read(name);
+    if (entry.is_directory())
+        return "/";
+    std::ostringstream mode;
+    mode << std::oct << static_cast<unsigned>(entry.status().permissions());
+    return mode.str() + ": " + folder.read(name);
 }
 
 /// Scenes are made by the thousand, which a disk would take minutes for.
@@ -35,13 +40,16 @@ Scene::Scene(bool confined) : folder_(fastFolder())
         fs::create_directory(folder_ / name);
     folder_.write("from/file", "0123456789");
     folder_.write("from/long", longContent());
+    fs::resize_file(folder_.write("from/sparse", "x"), 1 << 16);
+    folder_.write("from/7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak", "of another writer");
     folder_.write("from/folder/inner", "inner");
     folder_.write("from/folder/deeper/innermost", "innermost");
     fs::create_symlink("file", folder_ / "from/link");
     fs::create_symlink("folder", folder_ / "from/link to folder");
     fs::create_symlink("nothing", folder_ / "from/broken link");
     fs::create_hard_link(folder_ / "from/file", folder_ / "from/second name");
-    folder_.write("to/existing", "old");
+    // Bits that no new file has.
+    fs::permissions(folder_.write("to/existing", "old"), fs::perms(0672));
     boost::property_tree::ptree settings;
     if (confined)
         settings.put("root", folder_.path().native());

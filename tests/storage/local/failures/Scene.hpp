@@ -8,7 +8,8 @@
 
 namespace foundation::tests::support {
 
-/// What a folder holds: the content of each file by its path, "/" for a folder, and what each link says.
+/// What a folder holds: permission bits and content of each file by its path, "/" for a folder, and what each link
+/// says.
 using Tree = std::map<std::string, std::string>;
 
 /// A folder "from" with something of every kind, and a folder "to", so that a path tells the end of an operation that

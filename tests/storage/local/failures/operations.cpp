@@ -2,6 +2,7 @@
 
 #include <boost/any.hpp>
 #include <boost/date_time/posix_time/posix_time_types.hpp>
+#include <boost/property_tree/ptree.hpp>
 
 #include <array>
 #include <set>
@@ -125,11 +126,25 @@ boost::posix_time::ptime someTime()
     return boost::posix_time::ptime(boost::gregorian::date(2001, 2, 3), boost::posix_time::microseconds(4));
 }
 
-void writeTransaction(Scene const& scene, std::u16string const& name, StreamClosePolicy policy)
+void writeTransaction(IProvider const& provider, StorageIRI const& target, StreamClosePolicy policy)
 {
-    auto const stream = scene.provider().openTransactionalStream(scene.at(name), {});
+    auto const stream = provider.openTransactionalStream(target, {});
     writeAll(*stream, longContent());
     stream->close(policy);
+}
+
+void writeTransaction(Scene const& scene, std::u16string const& name, StreamClosePolicy policy)
+{
+    writeTransaction(scene.provider(), scene.at(name), policy);
+}
+
+void writeWithoutSync(Scene const& scene, std::u16string const& name)
+{
+    storage::local::LocalProvider provider;
+    boost::property_tree::ptree settings;
+    settings.put("durability", "none");
+    provider.configure(settings);
+    writeTransaction(provider, scene.at(name), StreamClosePolicy::Commit);
 }
 
 ByteStreamOpenOptions appending()
@@ -196,6 +211,7 @@ std::vector<Operation> transferOperations()
     return {
         move("moveFile", u"from/file", u"to/new", Preserve),
         lackingNoReplace(move("moveFile", u"from/file", u"to/new", Preserve)),
+        move("moveScratchFile", u"from/7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak", u"to/new", NoClobber),
         move("moveFileReplacing", u"from/file", u"to/existing", Overwrite),
         move("moveFileOntoOtherName", u"from/file", u"from/second name", Overwrite),
         move("moveFileOntoItself", u"from/file", u"from/file", Overwrite),
@@ -211,6 +227,7 @@ std::vector<Operation> transferOperations()
         copyAtomically("copyFileAtomicReplacing", u"from/long", u"to/existing", Overwrite),
         copyAtomically("copyFileAtomicReplacingLink", u"from/long", u"from/link", Overwrite),
         lackingKernelCopies(copyAtomically("copyFileAtomic", u"from/long", u"to/new", Preserve)),
+        copyAtomically("copySparseFileAtomic", u"from/sparse", u"to/new", Preserve),
         copyAtomically("copyFileAtomicOntoItself", u"from/file", u"from/second name", Overwrite),
         copy("copyFileOntoItself", u"from/file", u"from/second name", Overwrite),
     };
@@ -242,6 +259,7 @@ std::vector<Operation> streamOperations()
         change("commitNew", u"to/new", [](auto& s) { writeTransaction(s, u"to/new", StreamClosePolicy::Commit); }),
         change("commitReplacing", u"to/existing",
                [](auto& s) { writeTransaction(s, u"to/existing", StreamClosePolicy::Commit); }),
+        change("commitWithoutSync", u"to/existing", [](auto& s) { writeWithoutSync(s, u"to/existing"); }),
         change("commitReplacingLink", u"from/link",
                [](auto& s) { writeTransaction(s, u"from/link", StreamClosePolicy::Commit); }),
         change("abort", u"to/existing", [](auto& s) { writeTransaction(s, u"to/existing", StreamClosePolicy::Abort); }),
