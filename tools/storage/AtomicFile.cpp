@@ -16,18 +16,14 @@ constexpr provider::ByteStreamOpenOptions newFile{
 
 } // namespace
 
-AtomicFile::AtomicFile(provider::StorageItem const& target, Replace replace, bool isSynced) : TargetFile(target)
+AtomicFile::AtomicFile(provider::StorageItem const& target, Replace replace) : TargetFile(target)
 {
     if (replace == Replace::Files) {
         transaction_ = target.openTransactionalStream(newFile);
         return;
     }
     scratch_.emplace(target.getParent(), makeScratchName());
-    // Stores sync at the commit of a transaction, not where a stream is closed.
-    if (isSynced)
-        transaction_ = scratch_->openTransactionalStream(newFile);
-    else
-        scratchStream_ = scratch_->openStream(newFile);
+    scratchStream_ = scratch_->openStream(newFile);
 }
 
 AtomicFile::~AtomicFile()
@@ -42,13 +38,12 @@ provider::ByteStream& AtomicFile::stream()
 
 void AtomicFile::publish()
 {
-    if (transaction_ != nullptr)
+    if (transaction_ != nullptr) {
         transaction_->close(provider::StreamClosePolicy::Commit);
-    else
+    } else {
         scratchStream_->close();
-    isCommitted_ = transaction_ != nullptr;
-    if (scratch_)
         moveToTarget();
+    }
     isFinished_ = true;
 }
 
@@ -65,7 +60,8 @@ void AtomicFile::moveToTarget()
     try {
         scratch_->moveFile(target().getLocation(), ReplacementPolicy::Overwrite);
     } catch (...) {
-        target().removeFile();
+        if (scratch_->fileExists())
+            target().removeFile();
         throw;
     }
 }
@@ -76,12 +72,14 @@ bool AtomicFile::discard() noexcept
         return true;
     isFinished_ = true;
     try {
-        if (transaction_ != nullptr && !isCommitted_) {
+        if (transaction_ != nullptr) {
             transaction_->close(provider::StreamClosePolicy::Abort);
-        } else {
-            scratchStream_.reset();
-            scratch_->removeFile();
+            return true;
         }
+        scratchStream_.reset();
+        // A move that failed may have taken place, and be uncertain to last.
+        if (scratch_->fileExists())
+            scratch_->removeFile();
         return true;
     } catch (...) {
         return false;

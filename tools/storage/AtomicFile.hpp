@@ -12,12 +12,12 @@ namespace foundation::storage::tool {
 ///
 /// `Replace::Never` holds up to the last moment: the content is written beside the target, and takes its name only if
 /// nothing has it by then, also on stores that cannot move without replacing. One that is dropped without a commit
-/// leaves nothing.
+/// leaves nothing. Local files that are to be synced are so either way: with a commit, and with the move of a scratch
+/// file.
 class AtomicFile final : public TargetFile
 {
 public:
-    /// `isSynced` has the content on the disk before it takes the name, in a store that was told to sync.
-    AtomicFile(provider::StorageItem const& target, Replace replace, bool isSynced = false);
+    AtomicFile(provider::StorageItem const& target, Replace replace);
     ~AtomicFile() override;
 
     bool discard() noexcept override;
@@ -33,7 +33,6 @@ private:
     std::optional<provider::StorageItem> scratch_;
     std::unique_ptr<provider::ByteStream> scratchStream_;
     std::unique_ptr<provider::TransactionalStream> transaction_;
-    bool isCommitted_ = false; ///< the transaction is through, though its file may not have the name yet
     bool isFinished_ = false;
 };
 

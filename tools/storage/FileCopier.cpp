@@ -39,7 +39,7 @@ std::unique_ptr<TargetFile> openTarget(Place const& target, CopyOptions const& o
     return at(target, [&]() -> std::unique_ptr<TargetFile> {
         if (options.isInPlace)
             return std::make_unique<PlainFile>(target.item(), options.replace);
-        return std::make_unique<AtomicFile>(target.item(), options.replace, options.isSynced);
+        return std::make_unique<AtomicFile>(target.item(), options.replace);
     });
 }
 

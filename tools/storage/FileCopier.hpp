@@ -16,7 +16,6 @@ struct CopyOptions
     Replace replace = Replace::Never;
     bool isInPlace = false; ///< each file is written at its target; otherwise it appears there whole or not at all
     bool isUpdate = false;  ///< what is up to date already is passed over
-    bool isSynced = false;  ///< each file is on the disk when it has been copied, in stores that were told to sync
 };
 
 /// What became of a file.

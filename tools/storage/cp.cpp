@@ -30,7 +30,6 @@ CopyRunOptions runOptions(Options const& options)
     result.files.replace = options.replaces || options.isUpdate ? Replace::Files : Replace::Never;
     result.files.isInPlace = options.isInPlace;
     result.files.isUpdate = options.isUpdate;
-    result.files.isSynced = options.transfers.isSynced;
     result.telling = tellingOf(options.transfers);
     result.jobs = jobsOf(options.transfers);
     return result;

@@ -92,7 +92,6 @@ CopyRunOptions runOptions(Options const& options, Replace replace)
 {
     CopyRunOptions result;
     result.files.replace = replace;
-    result.files.isSynced = true;
     result.links = FileLinks::Refuse;
     result.telling = options.transfers.isJSON ? Telling::JSON : Telling::Nothing;
     result.jobs = jobsOf(options.transfers);

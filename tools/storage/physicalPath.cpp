@@ -11,12 +11,14 @@ namespace foundation::storage::tool {
 
 namespace {
 
-/// Empty where nothing is.
+/// Empty where nothing is, or nothing can be, as under a name that is too long.
 std::optional<std::u16string> resolved(std::u16string const& path)
 {
     try {
         return fl::filesystem::get_pathname_from_volume(fl::filesystem::upath(path), fl::filesystem::upath()).string();
     } catch (fl::filesystem::PathNotFound const&) {
+        return std::nullopt;
+    } catch (fl::filesystem::InvalidArgument const&) {
         return std::nullopt;
     }
 }

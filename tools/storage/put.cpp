@@ -33,7 +33,7 @@ std::unique_ptr<TargetFile> openTarget(Place const& target, Options const& optio
     return at(target, [&]() -> std::unique_ptr<TargetFile> {
         if (options.isInPlace)
             return std::make_unique<PlainFile>(target.item(), replace);
-        return std::make_unique<AtomicFile>(target.item(), replace, options.isSynced);
+        return std::make_unique<AtomicFile>(target.item(), replace);
     });
 }
 

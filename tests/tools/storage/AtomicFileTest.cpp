@@ -24,6 +24,7 @@ class UnreliableStore final : public MinimalProvider
 public:
     bool movesWithoutReplacing = true;
     std::function<void()> beforeMove = [] {};
+    std::function<void()> afterMove = [] {};
     std::function<long(char const*, long)> onWrite = {};
     std::function<long(long, std::ios_base::seekdir)> onSeek = {};
 
@@ -34,6 +35,7 @@ protected:
         if (!movesWithoutReplacing && policy == ReplacementPolicy::NoClobber)
             throw Exception(ErrorCode::UnsupportedOperation, to);
         MinimalProvider::doMoveFile(from, to, policy);
+        afterMove();
     }
 
     std::unique_ptr<ByteStream> doOpenStream(StorageIRI const& iri, ByteStreamOpenOptions const& options) const override
@@ -165,6 +167,21 @@ TEST_P(AtomicFilesThatReplaceNothing, AppearOnStoresThatCannotMoveWithoutReplaci
     write("content");
     EXPECT_EQ(store->content(target), "content");
     EXPECT_EQ(store->files.size(), 1U);
+}
+
+TEST_P(AtomicFilesThatReplaceNothing, StayWhereAMovePutThemThatFailedInTheEnd)
+{
+    store->afterMove = [] { throw Exception(ErrorCode::IOError, target); };
+    for (bool const movesWithoutReplacing : {true, false}) {
+        store->movesWithoutReplacing = movesWithoutReplacing;
+        AtomicFile file(StorageItem(store, target), GetParam());
+        file.write("content", 7);
+        EXPECT_THROW(file.commit(7), Exception);
+        EXPECT_TRUE(file.discard()) << "nothing is left beside it";
+        EXPECT_EQ(store->content(target), "content");
+        EXPECT_EQ(store->files.size(), 1U);
+        store->files.clear();
+    }
 }
 
 class AtomicFilesThatReplace : public AtomicFiles

@@ -178,6 +178,17 @@ TEST_F(Cp, NeedsTheFolderOfTheTarget)
     EXPECT_EQ(countEntries(), 1U);
 }
 
+TEST_F(Cp, RefusesANameThatIsTooLong)
+{
+    folder.write("a", "");
+    std::string const name(256, 'n');
+    for (std::string const command : {"cp", "mv"})
+        runFailing({command, "a", name}, "storage: " + command + ": " + name +
+                                             ": not a possible location (a name may be too long, or the host is not "
+                                             "this one)\n");
+    EXPECT_EQ(countEntries(), 1U);
+}
+
 TEST_F(Cp, NeverCopiesTwoSourcesToOneTarget)
 {
     makeFolder("d");

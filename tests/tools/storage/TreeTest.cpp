@@ -20,6 +20,15 @@ TEST_F(Tree, DrawsFoldersAndCountsThem)
                                       "2 folders, 1 file\n");
 }
 
+TEST_F(Tree, LeavesScratchFilesOutUnlessAskedForThem)
+{
+    makeFolder("a");
+    folder.write("a/7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak", "");
+    EXPECT_EQ(runWell({"tree", "a"}), "a\n\n0 folders, 0 files\n");
+    EXPECT_EQ(runWell({"tree", "--all", "a"}),
+              "a\n└── 7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak\n\n0 folders, 1 file\n");
+}
+
 TEST_F(Tree, DrawsTheLastEntryOfAFolderDifferently)
 {
     makeFolder("a");
