@@ -10,7 +10,9 @@
 #include <tools/storage/interrupt.hpp>
 #include <tools/storage/transfers.hpp>
 
+#include <boost/any.hpp>
 #include <boost/date_time/posix_time/posix_time_types.hpp>
+#include <cstdint>
 #include <fmt/format.h>
 #include <memory>
 #include <optional>
@@ -88,6 +90,29 @@ void requireLasting(Place const& target)
         throw Failure{target.text(), "goes when the command ends, so that nothing is moved there"};
 }
 
+/// The device that holds a file or folder; nothing where the store does not tell.
+std::optional<std::uint64_t> deviceOf(provider::StorageItem const& item)
+{
+    try {
+        auto const attributes = item.getExtendedAttributes();
+        if (attributes.hasAttribute("device"))
+            return boost::any_cast<std::uint64_t>(attributes.getAttribute("device"));
+    } catch (provider::Exception const&) {
+        // The move itself tells what is wrong.
+    }
+    return std::nullopt;
+}
+
+/// What a store then moves by copying is better copied here: that can be interrupted, and tells how far it is.
+bool isBetweenFileSystems(Place const& source, Kind kind, Place const& target)
+{
+    if ((kind != Kind::RegularFile && kind != Kind::RegularFolder) || !target.item().hasParent())
+        return false;
+    std::optional<std::uint64_t> const from = deviceOf(source.item());
+    std::optional<std::uint64_t> const to = from ? deviceOf(target.item().getParent()) : std::nullopt;
+    return from && to && *from != *to;
+}
+
 CopyRunOptions runOptions(Options const& options, Replace replace)
 {
     CopyRunOptions result;
@@ -161,7 +186,7 @@ void Move::tell(Place const& source, Place const& target)
 bool Move::moveWithinStore(Place const& source, Kind kind, Place const& target) const
 {
     using provider::ReplacementPolicy;
-    if (!source.item().hasSameProviderInstance(target.item()))
+    if (!source.item().hasSameProviderInstance(target.item()) || isBetweenFileSystems(source, kind, target))
         return false;
     provider::StorageIRI const to = target.item().getLocation();
     try {

@@ -29,14 +29,16 @@ std::string nameOf(std::string const& path)
 
 } // namespace
 
-ScratchFile::ScratchFile(Root const& root, StorageIRI const& target, Durability durability, int flags, mode_t mode)
+ScratchFile::ScratchFile(Root const& root, StorageIRI const& target, Durability durability, int flags, mode_t mode,
+                         Permissions permissions)
     : root_(root),
       target_(target),
       scratch_(target),
       path_(root.pathOf(target)),
       name_(nameOf(path_)),
       scratchName_(detail::scratchName()),
-      durability_(durability)
+      durability_(durability),
+      permissions_(permissions)
 {
     openFolders(path_);
     int const error = openFile(scratchAt(), flags | O_CREAT | O_EXCL | O_NOFOLLOW, file_, modeForNew(mode));
@@ -125,6 +127,8 @@ int ScratchFile::findTarget(Status& status) const
 /// The content of a file that others may not read is not for them while it is being written either.
 mode_t ScratchFile::modeForNew(mode_t mode) const
 {
+    if (permissions_ == Permissions::Own)
+        return mode;
     Status target;
     int const error = findTarget(target);
     if (error != 0 && !meansMissing(error))
@@ -158,7 +162,7 @@ void ScratchFile::keepPermissions()
         throwError(error, target_);
     if (error == 0 && isFolder(target))
         throwError(ErrorCode::ResourceAlreadyExists, target_);
-    if (error == 0 && S_ISREG(target.stx_mode))
+    if (error == 0 && S_ISREG(target.stx_mode) && permissions_ == Permissions::OfTarget)
         setPermissions(target.stx_mode & permissionBits);
 }
 

@@ -12,6 +12,13 @@
 
 namespace foundation::storage::local::detail {
 
+/// Whose permissions the content has that replaces a file.
+enum class Permissions
+{
+    OfTarget,
+    Own, ///< those that the scratch file was made with, or given since
+};
+
 /// A file that is written beside its target, and takes the target's place whole or not at all.
 ///
 /// The folders of both are opened at the start and everything happens in them: a folder that is renamed or swapped for
@@ -30,7 +37,7 @@ public:
     /// Makes a scratch file of a new name. `flags` are `O_WRONLY` or `O_RDWR`, and `O_APPEND` if wanted; a file that
     /// replaces none gets `mode` less the umask. Failures name the target.
     ScratchFile(Root const& root, provider::StorageIRI const& target, Durability durability, int flags = O_WRONLY,
-                mode_t mode = newFileMode);
+                mode_t mode = newFileMode, Permissions permissions = Permissions::OfTarget);
 
     /// Makes the scratch file at a location of the caller's choice, which may be in another folder of the same file
     /// system. One that stands there already is written into, as `O_TRUNC` says; without `O_CREAT` in `flags` one must.
@@ -48,7 +55,7 @@ public:
     /// Puts the file in the target's place, as durably as was asked for.
     ///
     /// `Overwrite` and `Clobber` replace a file or a link; the new content has the permission bits of the old, those of
-    /// the file that a link led to. `Preserve` and `NoClobber` replace nothing.
+    /// the file that a link led to, unless it was to keep its own. `Preserve` and `NoClobber` replace nothing.
     ///
     /// Errors: `ResourceAlreadyExists` naming the target for what must not be replaced, a folder always. After a
     /// failure it can be called again, or `discard`, with one exception: when the content could not be written to the
@@ -95,6 +102,7 @@ private:
     FileDescriptor scratchFolder_; ///< open only where it is another one
     FileDescriptor file_;
     Durability const durability_;
+    Permissions const permissions_ = Permissions::OfTarget;
     bool isFolderReadable_ = false;
     int lost_ = 0; ///< the `errno` of content that did not get to the disk
     State state_ = State::Writing;

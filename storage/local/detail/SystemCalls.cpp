@@ -35,6 +35,7 @@ constinit SystemCalls const realSystemCalls{
     .faccessat = ::faccessat,
     .fchmod = ::fchmod,
     .fchmodat = ::fchmodat,
+    .fchownat = ::fchownat,
     .utimensat = ::utimensat,
     .readlinkat = ::readlinkat,
     .listxattr = ::listxattr,

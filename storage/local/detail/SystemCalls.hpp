@@ -42,6 +42,7 @@ struct SystemCalls
     int (*faccessat)(int folder, char const* path, int mode, int flags);
     int (*fchmod)(int descriptor, mode_t mode);
     int (*fchmodat)(int folder, char const* path, mode_t mode, int flags);
+    int (*fchownat)(int folder, char const* path, uid_t owner, gid_t group, int flags);
     int (*utimensat)(int folder, char const* path, timespec const* times, int flags);
     ssize_t (*readlinkat)(int folder, char const* path, char* buffer, std::size_t size);
 

@@ -86,7 +86,9 @@ struct Failure
 class TreeRemoval
 {
 public:
-    explicit TreeRemoval(FileDescriptor parent) : chain_(std::move(parent)) {}
+    TreeRemoval(FileDescriptor parent, MayRemove mayRemove)
+        : chain_(std::move(parent)), mayRemove_(std::move(mayRemove))
+    {}
 
     /// Answers 0, or what is wrong with the folder itself before anything was removed. The rest is in `failure`.
     int remove(char const* name);
@@ -97,6 +99,7 @@ private:
     int enter(char const* name, int passes);
     void step();
     void readBatch();
+    int removeName(char const* name) const;
     void removeFile(char const* name);
     void removeFolder(char const* name);
     void leave();
@@ -106,7 +109,8 @@ private:
     template <typename MakePath>
     void noteAt(int error, MakePath const& makePath);
 
-    FolderChain chain_;         ///< from the folder that holds the one to remove
+    FolderChain chain_; ///< from the folder that holds the one to remove
+    MayRemove mayRemove_;
     std::vector<Level> levels_; ///< one for each folder that was entered
     Batch batch_;
     std::optional<Failure> failure_;
@@ -168,9 +172,16 @@ void TreeRemoval::readBatch()
     });
 }
 
+int TreeRemoval::removeName(char const* name) const
+{
+    At const entry{chain_.folder(), name};
+    int const error = mayRemove_ ? mayRemove_(entry) : 0;
+    return error != 0 ? error : detail::removeName(entry);
+}
+
 void TreeRemoval::removeFile(char const* name)
 {
-    int const error = removeName({chain_.folder(), name});
+    int const error = removeName(name);
     if (error == EISDIR)
         levels_.back().folders.append(name).push_back('\0');
     else if (error != 0 && error != ENOENT)
@@ -185,7 +196,7 @@ void TreeRemoval::removeFolder(char const* name)
     std::size_t const level = levels_.size() - 1;
     int error = enter(name, 0);
     if (error == ENOTDIR || error == ELOOP)
-        error = removeName({chain_.folder(), name});
+        error = removeName(name);
     if (error != 0 && error != ENOENT)
         noteEntry(error, name);
     else
@@ -242,6 +253,14 @@ StorageIRI locationOf(std::string const& path, StorageIRI const& folder)
                                       : StorageIRI(folder, fl::filesystem::from_native_bytes(path.substr(slash + 1)));
 }
 
+void requireRemoved(int error, TreeRemoval const& removal, StorageIRI const& folder)
+{
+    if (error != 0)
+        throwError(error, folder);
+    if (removal.failure())
+        throwError(removal.failure()->error, locationOf(removal.failure()->path, folder));
+}
+
 } // namespace
 
 void removeTree(Root const& root, StorageIRI const& folder)
@@ -251,14 +270,17 @@ void removeTree(Root const& root, StorageIRI const& folder)
     std::string name;
     if (int const error = root.openParent(path, parent, name))
         throwError(error, folder);
-    TreeRemoval removal(std::move(parent));
+    TreeRemoval removal(std::move(parent), {});
     int const error = removal.remove(name.c_str());
     if (error == ENOTDIR || error == ELOOP)
         throwNotAFolder(root, path, folder);
-    if (error != 0)
-        throwError(error, folder);
-    if (removal.failure())
-        throwError(removal.failure()->error, locationOf(removal.failure()->path, folder));
+    requireRemoved(error, removal, folder);
+}
+
+void removeTree(FileDescriptor parent, std::string const& name, StorageIRI const& folder, MayRemove mayRemove)
+{
+    TreeRemoval removal(std::move(parent), std::move(mayRemove));
+    requireRemoved(removal.remove(name.c_str()), removal, folder);
 }
 
 } // namespace foundation::storage::local::detail

@@ -1,7 +1,12 @@
 #pragma once
 
+#include <storage/local/detail/FileDescriptor.hpp>
 #include <storage/local/detail/Root.hpp>
+#include <storage/local/detail/fileSystem.hpp>
 #include <storage/provider/StorageIRI.hpp>
+
+#include <functional>
+#include <string>
 
 namespace foundation::storage::local::detail {
 
@@ -12,5 +17,12 @@ namespace foundation::storage::local::detail {
 /// Cost: one call for each file, about six for each folder. Memory for the names of a batch of entries, and for those
 /// of folders beside the way to where it works.
 void removeTree(Root const& root, provider::StorageIRI const& folder);
+
+/// Asked of each file and link right before it is removed: 0, or the `errno` for which it stays.
+using MayRemove = std::function<int(At const& entry)>;
+
+/// The same for a folder by its name in an open one; failures are told of below `folder`.
+void removeTree(FileDescriptor parent, std::string const& name, provider::StorageIRI const& folder,
+                MayRemove mayRemove = {});
 
 } // namespace foundation::storage::local::detail

@@ -63,6 +63,12 @@ int getFullStatus(FileDescriptor const& file, Status& status)
     return askStatus({file.get(), ""}, AT_EMPTY_PATH, status, STATX_BASIC_STATS | STATX_BTIME);
 }
 
+int getFullStatus(At const& at, Links links, Status& status)
+{
+    int const flags = links == Links::Keep ? AT_SYMLINK_NOFOLLOW : 0;
+    return askStatus(at, flags, status, STATX_BASIC_STATS | STATX_BTIME);
+}
+
 int checkAccess(At const& at, int mode)
 {
     return errorOf([&] { return systemCalls().faccessat(at.folder, at.path, mode, AT_EACCESS); });
@@ -97,9 +103,9 @@ int getAttribute(FileDescriptor const& file, char const* name, char* value, std:
     return sizeOf([&] { return systemCalls().getxattr(path.c_str(), name, value, maximumAttributeSize); }, size);
 }
 
-int makeFolder(At const& at)
+int makeFolder(At const& at, mode_t mode)
 {
-    return errorOf([&] { return systemCalls().mkdirat(at.folder, at.path, newFolderMode); });
+    return errorOf([&] { return systemCalls().mkdirat(at.folder, at.path, mode); });
 }
 
 int removeName(At const& at)

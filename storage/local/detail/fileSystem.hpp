@@ -37,8 +37,10 @@ inline constexpr mode_t newFolderMode = 0777;
 /// Of an open file.
 [[nodiscard]] int getStatus(FileDescriptor const& file, Status& status);
 
-/// The same, with all that `statx` can tell.
+// The same, with all that `statx` can tell.
+
 [[nodiscard]] int getFullStatus(FileDescriptor const& file, Status& status);
+[[nodiscard]] int getFullStatus(At const& at, Links links, Status& status);
 
 /// Whether this user may do what `mode` (`W_OK`, `X_OK`) says.
 [[nodiscard]] int checkAccess(At const& at, int mode);
@@ -58,8 +60,8 @@ inline constexpr std::size_t maximumAttributeSize = 64 * 1024; // no system hold
 [[nodiscard]] int listAttributes(FileDescriptor const& file, char* names, std::size_t& size);
 [[nodiscard]] int getAttribute(FileDescriptor const& file, char const* name, char* value, std::size_t& size);
 
-/// The folder gets mode 0777, less the umask.
-[[nodiscard]] int makeFolder(At const& at);
+/// The folder gets `mode`, less the umask.
+[[nodiscard]] int makeFolder(At const& at, mode_t mode = newFolderMode);
 
 int removeName(At const& at);
 int removeEmptyFolder(At const& at);

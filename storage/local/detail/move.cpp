@@ -2,6 +2,7 @@
 
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/fileSystem.hpp>
+#include <storage/local/detail/moveAcross.hpp>
 #include <storage/local/detail/scratchName.hpp>
 
 #include <cerrno>
@@ -99,13 +100,13 @@ int moveFileBySecondName(At const& from, At const& to)
 }
 
 /// For a file system without `RENAME_NOREPLACE`: a folder is renamed over an empty folder only, and this one is ours.
-int moveFolderOntoNewFolder(Move const& move)
+int moveFolderOntoNewFolder(At const& from, At const& to)
 {
-    if (int const error = makeFolder(move.target.at()))
+    if (int const error = makeFolder(to))
         return error;
-    int const error = renameEntry(move.source.at(), move.target.at(), 0);
+    int const error = renameEntry(from, to, 0);
     if (error != 0)
-        removeEmptyFolder(move.target.at());
+        removeEmptyFolder(to);
     return error;
 }
 
@@ -204,15 +205,24 @@ int moveFileWithoutReplacing(At const& from, At const& to)
     return lacksNoReplace(error) ? moveFileBySecondName(from, to) : error;
 }
 
+int moveFolderWithoutReplacing(At const& from, At const& to)
+{
+    int const error = renameEntry(from, to, RENAME_NOREPLACE);
+    return lacksNoReplace(error) ? moveFolderOntoNewFolder(from, to) : error;
+}
+
 void moveFile(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
 {
     Move const move(root, from, to);
     Status const source = requireSource(move);
     if (isFolder(source))
         throwError(ErrorCode::ResourceNotFound, from);
-    requireMoved(replaces(policy) ? moveFileReplacing(move, source)
-                                  : moveFileWithoutReplacing(move.source.at(), move.target.at()),
-                 move);
+    int const error = replaces(policy) ? moveFileReplacing(move, source)
+                                       : moveFileWithoutReplacing(move.source.at(), move.target.at());
+    if (error == EXDEV)
+        moveFileAcross(root, from, to, policy);
+    else
+        requireMoved(error, move);
 }
 
 void moveFolder(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
@@ -221,12 +231,16 @@ void moveFolder(Root const& root, StorageIRI const& from, StorageIRI const& to, 
     Status const source = requireSource(move);
     if (!isFolder(source))
         throwNotAFolder(root, move.fromPath, from);
-    int error = renameEntry(move.source.at(), move.target.at(), RENAME_NOREPLACE);
-    if (lacksNoReplace(error))
-        error = moveFolderOntoNewFolder(move);
+    int error = moveFolderWithoutReplacing(move.source.at(), move.target.at());
+    // Two file systems are told apart before anything is looked for.
+    if (error == EXDEV && findTarget(move, Links::Keep))
+        error = EEXIST;
     if (error == EEXIST && replaces(policy) && isOntoItself(move, source))
         return;
-    requireMoved(error, move);
+    if (error == EXDEV)
+        moveFolderAcross(root, from, to);
+    else
+        requireMoved(error, move);
 }
 
 void throwNotAFolder(Root const& root, std::string const& path, StorageIRI const& iri)

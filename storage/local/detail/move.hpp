@@ -13,6 +13,11 @@ bool replaces(provider::ReplacementPolicy policy);
 /// somebody who was faster by a moment. Answers 0 or `errno`.
 [[nodiscard]] int moveFileWithoutReplacing(At const& from, At const& to);
 
+/// The same for a folder, which replaces nothing at all.
+[[nodiscard]] int moveFolderWithoutReplacing(At const& from, At const& to);
+
+// From one file system to another they copy, see `moveAcross.hpp`.
+
 void moveFile(Root const& root, provider::StorageIRI const& from, provider::StorageIRI const& to,
               provider::ReplacementPolicy policy);
 void moveFolder(Root const& root, provider::StorageIRI const& from, provider::StorageIRI const& to,

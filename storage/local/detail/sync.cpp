@@ -33,6 +33,9 @@ int syncParent(Root const& root, std::string const& path, std::string const& ent
     if (error != EACCES)
         return error;
     error = root.open(entry, O_RDONLY | O_NOFOLLOW | O_NOCTTY | O_NONBLOCK, folder);
+    // A link cannot be opened: it is the folder that cannot be synced.
+    if (error == ELOOP)
+        return EACCES;
     return error != 0 ? error : syncFileSystem(folder);
 }
 

@@ -416,23 +416,5 @@ TEST_F(LocalProviderWatchedMoves, CannotLoseAFileThatTakesTheNameOfTheSourceMean
     EXPECT_EQ(folder.read("second name"), "old");
 }
 
-TEST(LocalProviderMovesBetweenFileSystems, AreRefusedAndChangeNothing)
-{
-    TemporaryFolder const from;
-    TemporaryFolder const to("/dev/shm");
-    struct stat fromStatus;
-    struct stat toStatus;
-    ASSERT_EQ(::stat(from.path().c_str(), &fromStatus), 0);
-    ASSERT_EQ(::stat(to.path().c_str(), &toStatus), 0);
-    if (fromStatus.st_dev == toStatus.st_dev)
-        GTEST_SKIP() << "there is one file system only";
-    from.write("file", "content");
-    for (ReplacementPolicy const policy : policies)
-        EXPECT_EQ(failureOf([&] { LocalProvider().moveFile(from.iri(u"file"), to.iri(u"new"), policy); }),
-                  failure(ErrorCode::UnsupportedOperation, to.iri(u"new")));
-    EXPECT_EQ(from.read("file"), "content");
-    EXPECT_FALSE(fs::exists(to / "new"));
-}
-
 } // namespace
 } // namespace foundation::storage::local

@@ -171,6 +171,7 @@ constexpr std::array entries{
     Entry{"faccessat", &Intercepted<&SystemCalls::faccessat>::putInto},
     Entry{"fchmod", &Intercepted<&SystemCalls::fchmod>::putInto},
     Entry{"fchmodat", &Intercepted<&SystemCalls::fchmodat>::putInto},
+    Entry{"fchownat", &Intercepted<&SystemCalls::fchownat>::putInto},
     Entry{"utimensat", &Intercepted<&SystemCalls::utimensat>::putInto},
     Entry{"readlinkat", &Intercepted<&SystemCalls::readlinkat>::putInto},
     Entry{"listxattr", &Intercepted<&SystemCalls::listxattr>::putInto},

@@ -40,7 +40,7 @@ void runInto(Ending& ending, Operation const& operation, Scene const& scene, Fai
 {
     FailingSystemCalls const failing([&](SystemCall const& call) {
         Fate const fate = plan(call);
-        return fate.error == 0 && operation.lacks(call) ? Fate::fails(EINVAL) : fate;
+        return fate.error == 0 && operation.lacks(call) ? Fate::fails(operation.lacking) : fate;
     });
     try {
         ending.found = operation.run(scene);

@@ -42,8 +42,8 @@ bool isNoShortage(int error)
 
 constexpr Case cases[] = {
     {anything, "fadvise", anything, any, Ignored::WithSameResult, "it is advice; nothing depends on it"},
-    {"commit.*|copy.*Atomic.*", "close", "(to/(new|existing)|from/link)", any, Ignored::WithSameResult,
-     "the content is on the disk before it takes the place of the target"},
+    {"commit.*|copy.*Atomic.*|move.*AcrossFileSystems", "close", "(to/(new|existing)|from/link)", any,
+     Ignored::WithSameResult, "the content is on the disk before it takes the place of the target"},
     {anything, "ficlone|copy_file_range", anything, any, Ignored::WithSameResult,
      "the content is read and written instead, which tells the end that fails"},
     {"copySparseFileAtomic", "lseek", "from/sparse", any, Ignored::WithSameResult,

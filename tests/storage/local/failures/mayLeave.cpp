@@ -22,6 +22,15 @@ bool isMixture(Tree const& tree, Tree const& before, Tree const& after)
     return true;
 }
 
+/// Whether what is after is there, and more of what was before than is left in the end.
+bool isOnTheWay(Tree const& tree, Tree const& before, Tree const& after)
+{
+    for (auto const& [path, content] : after)
+        if (!isEntry(tree, path, content))
+            return false;
+    return isMixture(tree, before, after);
+}
+
 } // namespace
 
 std::string toBytes(std::u16string const& name)
@@ -35,6 +44,8 @@ bool mayLeave(Operation const& operation, Tree tree, Tree before, Tree after)
         return true;
     if (operation.leaves == Leaves::SomeEntries)
         return isMixture(tree, before, after);
+    if (operation.leaves == Leaves::OneAndPartOfOther)
+        return isOnTheWay(tree, before, after);
     if (operation.leaves != Leaves::PartOfContent)
         return false;
     std::string const written = toBytes(operation.to.empty() ? operation.from : operation.to);

@@ -56,6 +56,19 @@ Operation lackingNoReplace(Operation operation)
     return operation;
 }
 
+/// With the folders "from" and "to" as two file systems.
+Operation acrossFileSystems(Operation operation)
+{
+    operation.name += "AcrossFileSystems";
+    operation.leaves = Leaves::OneAndPartOfOther;
+    operation.lacking = EXDEV;
+    operation.lacks = [](SystemCall const& call) {
+        return call.name == "renameat2" && call.paths.front().find("/from/") != std::string::npos &&
+               call.paths.back().find("/to/") != std::string::npos;
+    };
+    return operation;
+}
+
 Operation copy(std::string name, std::u16string const& from, std::u16string const& to, ReplacementPolicy policy)
 {
     Operation operation = transfer(std::move(name), from, to,
@@ -209,6 +222,11 @@ std::vector<Operation> transferOperations()
                         [=](Scene const& s) { s.provider().moveFolder(s.at(from), s.at(to), policy); });
     };
     return {
+        acrossFileSystems(move("moveFile", u"from/long", u"to/new", Preserve)),
+        acrossFileSystems(move("moveSmallFileReplacing", u"from/file", u"to/existing", Overwrite)),
+        acrossFileSystems(move("moveLink", u"from/link", u"to/new", Preserve)),
+        acrossFileSystems(move("moveLinkReplacing", u"from/link", u"to/existing", Overwrite)),
+        acrossFileSystems(moveFolder("moveFolder", u"from/folder", u"to/new", Preserve)),
         move("moveFile", u"from/file", u"to/new", Preserve),
         lackingNoReplace(move("moveFile", u"from/file", u"to/new", Preserve)),
         move("moveScratchFile", u"from/7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak", u"to/new", NoClobber),

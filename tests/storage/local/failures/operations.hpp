@@ -3,6 +3,7 @@
 #include <tests/storage/local/failures/FailingSystemCalls.hpp>
 #include <tests/storage/local/failures/Scene.hpp>
 
+#include <cerrno>
 #include <functional>
 #include <ostream>
 #include <string>
@@ -13,9 +14,10 @@ namespace foundation::tests::support {
 /// What an operation that failed may leave behind.
 enum class Leaves
 {
-    AllOrNothing,  ///< what was there before, or all that the operation does
-    SomeEntries,   ///< each entry as it was before or as the operation makes it
-    PartOfContent, ///< any content at the target, which is written in place
+    AllOrNothing,      ///< what was there before, or all that the operation does
+    SomeEntries,       ///< each entry as it was before or as the operation makes it
+    OneAndPartOfOther, ///< what was there before; or all that the operation makes, and some of what it removes
+    PartOfContent,     ///< any content at the target, which is written in place
 };
 
 /// Which end an operation names that failed, where a call works on one alone.
@@ -34,7 +36,8 @@ struct Operation
     Leaves leaves = Leaves::AllOrNothing;
     Blames blames = Blames::TheRightOne;
 
-    /// What the file system does not know: it answers EINVAL.
+    /// What the file system does not know, and what it answers.
+    int lacking = EINVAL;
     std::function<bool(SystemCall const&)> lacks = [](SystemCall const&) { return false; };
 
     /// Answers what it found, if it looks for anything: the same each time.
