@@ -112,6 +112,12 @@ void StorageItem::moveFolder(StorageIRI const& to, ReplacementPolicy const& poli
     provider_->moveFolder(location_, to, policy);
 }
 
+TransactionStatus StorageItem::copyFileAtomic(StorageIRI const& to, ReplacementPolicy const& policy,
+                                              IProvider::Interrupt const& interrupt) const
+{
+    return provider_->copyFileAtomic(location_, to, policy, interrupt);
+}
+
 FileAttributes StorageItem::getFileAttributes() const
 {
     return provider_->getFileAttributes(location_);

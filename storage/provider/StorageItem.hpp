@@ -53,6 +53,8 @@ public:
     void removeFolderRecursively() const;
     void moveFile(StorageIRI const& to, ReplacementPolicy const& policy) const;
     void moveFolder(StorageIRI const& to, ReplacementPolicy const& policy) const;
+    TransactionStatus copyFileAtomic(StorageIRI const& to, ReplacementPolicy const& policy,
+                                     IProvider::Interrupt const& interrupt) const;
     FileAttributes getFileAttributes() const;
     FolderAttributes getFolderAttributes() const;
     ExtendedAttributes getExtendedAttributes() const;

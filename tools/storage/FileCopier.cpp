@@ -153,7 +153,7 @@ std::uint64_t FileCopier::copyInStore(Place const& source, Place const& target, 
     auto const policy = options_.replace == Replace::Files ? provider::ReplacementPolicy::Overwrite
                                                            : provider::ReplacementPolicy::NoClobber;
     try {
-        source.item().copyFile(target.item(), {policy, provider::TransactionPolicy::Atomic, onChunk});
+        source.item().copyFileAtomic(target.item().getLocation(), policy, onChunk);
     } catch (provider::Exception const& error) {
         rethrowAsFailure(error.getStorageIRI() == target.item().getLocation() ? target : source);
     } catch (std::exception const&) {

@@ -112,7 +112,8 @@ TransactionStatus copyFileAtomic(Settings const& settings, StorageIRI const& fro
     bool const looks = replaces(policy) || source.status.stx_size > lookSize;
     if (looks && leadsToSource(copy, source))
         return TransactionStatus::Completed;
-    ScratchFile scratch(settings.root, to, settings.durability, O_WRONLY, modeOfCopy(source));
+    ScratchFile scratch(settings.root, to, settings.durability, O_WRONLY, modeOfCopy(source),
+                        replaces(policy) ? Permissions::OfTarget : Permissions::Own);
     CopyResult const result = copyContent(source.file, source.status, scratch.file(), interrupt);
     if (result.outcome == CopyOutcome::Aborted)
         return TransactionStatus::Aborted;

@@ -252,6 +252,24 @@ TEST_F(LocalProviderCopies, InPlaceNameTheSourceWhicheverEndFailed)
               failure(ErrorCode::NoSpaceLeft, at(u"from")));
 }
 
+TEST_F(LocalProviderCopies, OfSmallFilesToNewNamesLookAtNothingButTheOpenSource)
+{
+    folder_.write("from", "content");
+    int looks = 0;
+    {
+        ReplacedSystemCalls calls;
+        static int* counter = nullptr;
+        counter = &looks;
+        calls->statx = [](int at, char const* path, int flags, unsigned mask, struct statx* result) {
+            ++*counter;
+            return ::statx(at, path, flags, mask, result);
+        };
+        copyAtomic(u"from", u"to", ReplacementPolicy::NoClobber);
+    }
+    EXPECT_EQ(looks, 1);
+    EXPECT_EQ(folder_.read("to"), "content");
+}
+
 TEST_F(LocalProviderCopies, NeverReplaceWhatAppearsMeanwhile)
 {
     for (std::size_t const size : {std::size_t{7}, largeSize}) {

@@ -59,6 +59,8 @@ std::vector<Row> forwards()
         {"doRemoveFolderRecursively(s://h/a)", [](I i) { i.removeFolderRecursively(); }},
         {"doMoveFile(s://h/a, s://h/b, ReplacementPolicy::Clobber)", [](I i) { i.moveFile(there, policy); }},
         {"doMoveFolder(s://h/a, s://h/b, ReplacementPolicy::Clobber)", [](I i) { i.moveFolder(there, policy); }},
+        {"doCopyFileAtomic(s://h/a, s://h/b, ReplacementPolicy::Clobber, no function)",
+         [](I i) { i.copyFileAtomic(there, policy, {}); }},
         {"doGetFileAttributes(s://h/a)", [](I i) { i.getFileAttributes(); }},
         {"doGetFolderAttributes(s://h/a)", [](I i) { i.getFolderAttributes(); }},
         {"doGetExtendedAttributes(s://h/a)", [](I i) { i.getExtendedAttributes(); }},
@@ -349,6 +351,9 @@ static_assert(allAre<Operation<std::u16string>>(&S::getName, &S::getScheme));
 static_assert(allAre<Operation<S>>(&S::getParent));
 static_assert(allAre<Operation<bool, S const&>>(&S::operator==, &S::operator!=, &S::hasSameProviderInstance));
 static_assert(allAre<Operation<void, StorageIRI const&, ReplacementPolicy const&>>(&S::moveFile, &S::moveFolder));
+static_assert(
+    allAre<Operation<TransactionStatus, StorageIRI const&, ReplacementPolicy const&, IProvider::Interrupt const&>>(
+        &S::copyFileAtomic));
 static_assert(allAre<Operation<FileAttributes>>(&S::getFileAttributes));
 static_assert(allAre<Operation<FolderAttributes>>(&S::getFolderAttributes));
 static_assert(allAre<Operation<ExtendedAttributes>>(&S::getExtendedAttributes));
