@@ -31,7 +31,7 @@ bool namesThisMachine(std::u16string_view text)
     if (!equalIgnoringCase(text.substr(0, scheme.size()), scheme))
         return false;
     text.remove_prefix(scheme.size());
-    if (text.find_first_of(u"?#") != std::u16string_view::npos)
+    if (std::any_of(text.begin(), text.end(), [](char16_t unit) { return unit == u'?' || unit == u'#'; }))
         return false;
     if (!text.starts_with(u"//"))
         return text.starts_with(u'/');
