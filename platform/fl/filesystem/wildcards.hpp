@@ -22,10 +22,13 @@ enum class LetterCase
 /// classes such as `[:digit:]`. A range from a later to an earlier character is empty. A `[` that no `]` closes stands
 /// for itself: every text is a pattern. A character is a code point; a surrogate that is not part of a pair is one,
 /// too. Nothing else is special, be it a leading dot or a backslash. A `/`, which no name holds, is matched by itself
-/// alone. Ownership: copies share what was made ready. Threads: any number at once. Cost: some microseconds to make; a
-/// match takes at worst the product of both lengths, whatever the number of stars. It allocates nothing for a name of
-/// at most 255 code units, but for the first name in each thread. Source: POSIX.1-2017, section 2.13 of the Shell
-/// Command Language, without classes, collation and escapes.
+/// alone.
+///
+/// Source: POSIX.1-2017, section 2.13 of the Shell Command Language, without classes, collation and escapes.
+/// Ownership: copies share what was made ready.
+/// Threads: any number at once.
+/// Cost: some microseconds to make; a match takes at worst the product of both lengths, whatever the number of stars.
+/// It allocates nothing for a name of at most 255 code units, but for the first name in each thread.
 class FOUNDATION_API Wildcards
 {
 public:

@@ -37,6 +37,16 @@ int openOnSameMount(At const& at, FileDescriptor& folder)
     return error == ENOSYS ? openUnlessMounted(at, folder) : error;
 }
 
+/// Some file systems know no place any more in a folder that has been removed; it holds nothing.
+int goTo(off_t position, FileDescriptor const& folder)
+{
+    if (systemCalls().lseek(folder.get(), position, SEEK_SET) != -1)
+        return 0;
+    int const error = errno;
+    Status status;
+    return getStatus(folder, status) == 0 && status.stx_nlink == 0 ? 0 : error;
+}
+
 } // namespace
 
 FolderChain::FolderChain(FileDescriptor outermost)
@@ -117,8 +127,8 @@ int FolderChain::reopenInnermost(int below)
     }
     firstOpen_ = std::max<std::size_t>(found, 1);
     if (found != 0) {
-        if (systemCalls().lseek(folder.get(), levels_.back().position, SEEK_SET) == -1)
-            return errno;
+        if (int const error = goTo(levels_.back().position, folder))
+            return error;
         levels_.back().descriptor = std::move(folder);
     }
     return isLost ? ESTALE : 0;

@@ -13,6 +13,8 @@
 #include <cstdio>
 #include <cstring>
 #include <dirent.h>
+#include <fstream>
+#include <unistd.h>
 
 namespace foundation::storage::local {
 namespace {
@@ -55,6 +57,15 @@ protected:
             result->stx_mode = S_IFREG;
             return 0;
         };
+    }
+
+    /// The memory of this process, whoever allocated it.
+    static std::ptrdiff_t residentBytes()
+    {
+        std::ptrdiff_t ignored = 0;
+        std::ptrdiff_t pages = 0;
+        std::ifstream("/proc/self/statm") >> ignored >> pages;
+        return pages * ::sysconf(_SC_PAGESIZE);
     }
 
     /// By how many bytes the memory in use grew at most while the folder was listed.
@@ -106,6 +117,23 @@ TEST_F(LocalProviderCost, OfAPatternIsABufferAndAnEntryOfMemoryForAMillionFiles)
     EXPECT_GE(growth, buffer);
     EXPECT_LT(growth, buffer + 8 * anEntry);
 }
+
+/// A sanitizer keeps memory that was given back.
+#if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+TEST_F(LocalProviderCost, LeavesTheMemoryOfTheProcessWhereItWasForAMillionFiles)
+{
+    std::ptrdiff_t const before = residentBytes();
+    std::ptrdiff_t most = 0;
+    auto const listing = provider.listAll(folder.iri());
+    for ([[maybe_unused]] FolderEntry const& entry : entries(*listing)) {
+        if (++walked % 10'000 == 0)
+            most = std::max(most, residentBytes());
+    }
+    EXPECT_EQ(walked, entryCount);
+    EXPECT_GE(most, before / 2) << "it was measured";
+    EXPECT_LT(most - before, 1 << 20);
+}
+#endif
 
 TEST_F(LocalProviderCost, IsOneAllocationForANameAndThreeForItsAttributes)
 {

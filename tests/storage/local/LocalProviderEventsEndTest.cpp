@@ -157,6 +157,23 @@ TEST_F(LocalProviderEventsEndConcurrency, GivesWatchesBackOneByOne)
     EXPECT_EQ(kernelObjects().watches, before);
 }
 
+TEST_F(LocalProviderEventsEndConcurrency, OfManyFoldersGivesBackOneThreadAndOneQueue)
+{
+    constexpr int folders = 50;
+    auto const before = kernelObjects();
+    for (int i = 0; i < folders; ++i) {
+        std::string const name = std::to_string(i);
+        makeFolder(name);
+        watchFolder(std::u16string(name.begin(), name.end()));
+    }
+    auto const watching = kernelObjects();
+    EXPECT_EQ(watching.threads, before.threads + 1);
+    EXPECT_EQ(watching.descriptors, before.descriptors + 2) << "the queue, and what wakes the thread";
+    EXPECT_EQ(watching.watches, before.watches + folders);
+    provider->shutdown();
+    EXPECT_EQ(kernelObjectsSettledTo(before), before);
+}
+
 TEST_F(LocalProviderEventsEndConcurrency, ComesWithShutdownOnceAndForAll)
 {
     auto const before = kernelObjects();

@@ -153,6 +153,35 @@ TEST_F(LocalProviderRecursiveListing, GoesAsDeepAsItGetsWithFewDescriptors)
     provider.removeFolderRecursively(folder.iri(u"d"));
 }
 
+TEST_F(LocalProviderRecursiveListing, AsksNothingForNamesAndOncePerEntryForAttributes)
+{
+    static int asked;
+    asked = 0;
+    ReplacedSystemCalls calls;
+    calls->statx = [](int at, char const* path, int flags, unsigned mask, struct statx* result) {
+        ++asked;
+        return realSystemCalls.statx(at, path, flags, mask, result);
+    };
+    EXPECT_EQ(allNamesOnly(), content);
+    EXPECT_EQ(asked, 0);
+    EXPECT_EQ(all(), content);
+    EXPECT_EQ(asked, static_cast<int>(content.size()));
+}
+
+TEST_F(LocalProviderRecursiveListing, EndsWhereTheTreeIsRemovedAroundIt)
+{
+    constexpr std::size_t depth = 3 * detail::FolderChain::maximumOpen;
+    for (bool const withAttributes : {true, false}) {
+        makeDeepFolders(folder.path(), depth);
+        auto const listing =
+            withAttributes ? provider.listAllRecursive(folder.iri()) : provider.listAllRecursiveNamesOnly(folder.iri());
+        while (listing->entry().getName().size() < 2 * depth - 1)
+            listing->next();
+        provider.removeFolderRecursively(folder.iri(u"d"));
+        EXPECT_EQ(failureOf([&] { rest(*listing); }), "no failure");
+    }
+}
+
 TEST_F(LocalProviderRecursiveListing, EntersWhatIsMountedBelow)
 {
     ScopedMount const mount = ScopedMount::fileSystem(folder / "a/b");
