@@ -1,13 +1,17 @@
 #include <tools/storage/TreeRemover.hpp>
 
+#include <storage/local/folderRemoval.hpp>
 #include <storage/provider/Exception.hpp>
 #include <storage/provider/ExtendedFeature.hpp>
 #include <tools/storage/describe.hpp>
 #include <tools/storage/interrupt.hpp>
 #include <tools/storage/kinds.hpp>
 #include <tools/storage/leaveBehind.hpp>
+#include <tools/storage/physicalPath.hpp>
 
+#include <memory>
 #include <utility>
+#include <vector>
 
 namespace foundation::storage::tool {
 
@@ -16,8 +20,25 @@ TreeRemover::TreeRemover(Session& session) : session_(session) {}
 void TreeRemover::remove(Place const& folder)
 {
     check_ = nullptr;
-    if (!removesWhole(folder))
+    if (isLocal(folder))
+        removeLocal(folder);
+    else if (!removesWhole(folder))
         walk(folder, std::nullopt);
+}
+
+/// A walk along paths could be led elsewhere by whoever swaps folders for links meanwhile.
+void TreeRemover::removeLocal(Place const& folder)
+{
+    auto const staying = std::make_shared<std::vector<local::StayingEntry>>();
+    at(folder, [&] {
+        doOrLeaveBehind([staying, location = folder.item().getLocation()] {
+            *staying = local::removeFolderAsFarAsPossible(location);
+        });
+    });
+    for (local::StayingEntry const& entry : *staying) {
+        Place const place = entry.path.empty() ? folder : folder.child(entry.path);
+        session_.complain({place.text(), describe(entry.reason)});
+    }
 }
 
 void TreeRemover::remove(Place const& folder, Place const& counterpart, Check check)

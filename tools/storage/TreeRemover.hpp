@@ -11,8 +11,8 @@ namespace foundation::storage::tool {
 
 /// Removes folders with all they hold, and never what a link leads to.
 ///
-/// A store that can remove a whole folder does so; where something stays, what stays is gone through entry by entry, so
-/// that each is named.
+/// A store that can remove a whole folder does so. Of a local one it tells what stays; elsewhere what stays is gone
+/// through entry by entry, so that each is named.
 class TreeRemover
 {
 public:
@@ -30,6 +30,7 @@ public:
 private:
     void walk(Place const& folder, std::optional<Place> counterpart);
     void step();
+    void removeLocal(Place const& folder);
     bool removesWhole(Place const& folder);
     void removeEntry(FolderLevel& level, ListedName const& entry);
     bool leavesEntries(FolderLevel const& level);

@@ -1,5 +1,3 @@
-#include <fl/i18n/case.hpp>
-#include <foundation/ustring.hpp>
 #include <storage/local/scratchFiles.hpp>
 #include <storage/provider/Exception.hpp>
 #include <tools/storage/Session.hpp>
@@ -8,6 +6,7 @@
 #include <tools/storage/commands.hpp>
 #include <tools/storage/describe.hpp>
 #include <tools/storage/entries.hpp>
+#include <tools/storage/physicalPath.hpp>
 #include <tools/storage/scratchName.hpp>
 #include <tools/storage/values.hpp>
 
@@ -36,7 +35,7 @@ constexpr ScratchFileState gone = ScratchFileState::InUse;
 
 void requireLocalFolder(Place const& place)
 {
-    if (ustring::transform(place.item().getLocation().getScheme(), fl::i18n::to_lower) != u"file")
+    if (!isLocal(place))
         throw Failure{place.text(), "scratch files can be removed from local folders only"};
     if (!leadsToFolder(existingKindOf(place)))
         throw Failure{place.text(), "not a folder"};

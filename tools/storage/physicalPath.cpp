@@ -3,6 +3,8 @@
 #include <fl/filesystem/exceptions.hpp>
 #include <fl/filesystem/upath.hpp>
 #include <fl/filesystem/volume.hpp>
+#include <fl/i18n/case.hpp>
+#include <foundation/ustring.hpp>
 #include <tools/storage/describe.hpp>
 
 #include <optional>
@@ -46,6 +48,11 @@ std::u16string resolvedAsFarAsItExists(std::u16string const& path)
 }
 
 } // namespace
+
+bool isLocal(Place const& place)
+{
+    return ustring::transform(place.item().getLocation().getScheme(), fl::i18n::to_lower) == u"file";
+}
 
 std::u16string physicalPath(Place const& place)
 {

@@ -7,6 +7,9 @@
 
 namespace foundation::storage::tool {
 
+/// Whether the place is one in the file system of this machine.
+bool isLocal(Place const& place);
+
 /// One text for what a place names, whether it exists or not and by whichever links and dots it is reached.
 std::u16string physicalPath(Place const& place);
 

@@ -11,7 +11,6 @@
 #include <cstddef>
 #include <cstdint>
 #include <dirent.h>
-#include <optional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -77,23 +76,24 @@ struct Level
     bool hasFailed = false;   ///< something in it stays
 };
 
-struct Failure
+/// The paths of a removal begin with the name of the folder.
+std::string withoutFirstName(std::string const& path)
 {
-    int error;
-    std::string path;
-};
+    std::size_t const slash = path.find('/');
+    return slash == std::string::npos ? std::string() : path.substr(slash + 1);
+}
 
 class TreeRemoval
 {
 public:
-    TreeRemoval(FileDescriptor parent, MayRemove mayRemove)
-        : chain_(std::move(parent)), mayRemove_(std::move(mayRemove))
+    TreeRemoval(FileDescriptor parent, Failures wanted, MayRemove mayRemove)
+        : chain_(std::move(parent)), mayRemove_(std::move(mayRemove)), wanted_(wanted)
     {}
 
-    /// Answers 0, or what is wrong with the folder itself before anything was removed. The rest is in `failure`.
+    /// Answers 0, or what is wrong with the folder itself before anything was removed. The rest is in `failures`.
     int remove(char const* name);
 
-    std::optional<Failure> const& failure() const { return failure_; }
+    std::vector<RemovalFailure>& failures() { return failures_; }
 
 private:
     int enter(char const* name, int passes);
@@ -113,7 +113,8 @@ private:
     MayRemove mayRemove_;
     std::vector<Level> levels_; ///< one for each folder that was entered
     Batch batch_;
-    std::optional<Failure> failure_;
+    Failures wanted_;
+    std::vector<RemovalFailure> failures_;
 };
 
 int TreeRemoval::remove(char const* name)
@@ -235,52 +236,53 @@ void TreeRemoval::noteEntry(int error, std::string const& name)
     noteAt(error, [&] { return chain_.depth() == 0 ? name : chain_.path() + '/' + name; });
 }
 
-/// `makePath` is called for the first failure alone.
+/// `makePath` is called for the failures that are wanted alone.
 template <typename MakePath>
 void TreeRemoval::noteAt(int error, MakePath const& makePath)
 {
     if (!levels_.empty())
         levels_.back().hasFailed = true;
-    if (!failure_)
-        failure_ = {error, makePath()};
+    if (wanted_ == Failures::All || failures_.empty())
+        failures_.push_back({error, withoutFirstName(makePath())});
 }
 
-/// `path` begins with the name of the folder.
-StorageIRI locationOf(std::string const& path, StorageIRI const& folder)
+void throwFirst(std::vector<RemovalFailure> const& failures, StorageIRI const& folder)
 {
-    std::size_t const slash = path.find('/');
-    return slash == std::string::npos ? folder
-                                      : StorageIRI(folder, fl::filesystem::from_native_bytes(path.substr(slash + 1)));
-}
-
-void requireRemoved(int error, TreeRemoval const& removal, StorageIRI const& folder)
-{
-    if (error != 0)
-        throwError(error, folder);
-    if (removal.failure())
-        throwError(removal.failure()->error, locationOf(removal.failure()->path, folder));
+    if (failures.empty())
+        return;
+    auto const& [error, path] = failures.front();
+    throwError(error, path.empty() ? folder : StorageIRI(folder, fl::filesystem::from_native_bytes(path)));
 }
 
 } // namespace
 
-void removeTree(Root const& root, StorageIRI const& folder)
+std::vector<RemovalFailure> removeTree(Root const& root, StorageIRI const& folder, Failures wanted)
 {
     std::string const path = root.pathOf(folder);
     FileDescriptor parent;
     std::string name;
     if (int const error = root.openParent(path, parent, name))
         throwError(error, folder);
-    TreeRemoval removal(std::move(parent), {});
+    TreeRemoval removal(std::move(parent), wanted, {});
     int const error = removal.remove(name.c_str());
     if (error == ENOTDIR || error == ELOOP)
         throwNotAFolder(root, path, folder);
-    requireRemoved(error, removal, folder);
+    if (error != 0)
+        throwError(error, folder);
+    return std::move(removal.failures());
+}
+
+void removeTree(Root const& root, StorageIRI const& folder)
+{
+    throwFirst(removeTree(root, folder, Failures::First), folder);
 }
 
 void removeTree(FileDescriptor parent, std::string const& name, StorageIRI const& folder, MayRemove mayRemove)
 {
-    TreeRemoval removal(std::move(parent), std::move(mayRemove));
-    requireRemoved(removal.remove(name.c_str()), removal, folder);
+    TreeRemoval removal(std::move(parent), Failures::First, std::move(mayRemove));
+    if (int const error = removal.remove(name.c_str()))
+        throwError(error, folder);
+    throwFirst(removal.failures(), folder);
 }
 
 } // namespace foundation::storage::local::detail

@@ -7,8 +7,21 @@
 
 #include <functional>
 #include <string>
+#include <vector>
 
 namespace foundation::storage::local::detail {
+
+struct RemovalFailure
+{
+    int error;
+    std::string path; ///< from the folder; empty for the folder itself
+};
+
+enum class Failures
+{
+    First,
+    All,
+};
 
 /// Removes a folder with all it holds, and never what a link leads to or what is mounted on a folder below.
 ///
@@ -17,6 +30,9 @@ namespace foundation::storage::local::detail {
 /// Cost: one call for each file, about six for each folder. Memory for the names of a batch of entries, and for those
 /// of folders beside the way to where it works.
 void removeTree(Root const& root, provider::StorageIRI const& folder);
+
+/// The same, but answers the failures that are wanted instead of throwing for entries that stay.
+std::vector<RemovalFailure> removeTree(Root const& root, provider::StorageIRI const& folder, Failures wanted);
 
 /// Asked of each file and link right before it is removed: 0, or the `errno` for which it stays.
 using MayRemove = std::function<int(At const& entry)>;
