@@ -85,7 +85,7 @@ int syncContent(Root const& root, std::string const& path)
 void syncScratchFile(Settings const& settings, StorageIRI const& from)
 {
     std::string const path = settings.root.pathOf(from);
-    if (settings.durability == Durability::None || !isScratchName(path.substr(path.rfind('/') + 1)))
+    if (settings.durability == Durability::None || !isScratchName(nameOf(path)))
         return;
     if (int const error = syncContent(settings.root, path))
         throwError(error, from);
@@ -399,7 +399,7 @@ void LocalProvider::doPublishFileEventsFor(StorageIRI const& file, ChangeEventCa
 {
     auto const root = this->root();
     std::string const path = root->pathOf(file);
-    std::string name = path.substr(path.rfind('/') + 1);
+    std::string name = nameOf(path);
     if (name.empty() || name == "." || name == "..")
         throw ChangeEventsSubscriptionException(file);
     StorageIRI const folder = file.getParent();

@@ -2,6 +2,7 @@
 
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/move.hpp>
+#include <storage/local/detail/nativePath.hpp>
 #include <storage/local/detail/scratchName.hpp>
 #include <storage/local/detail/sync.hpp>
 
@@ -16,16 +17,6 @@ using provider::StorageIRI;
 namespace {
 
 constexpr unsigned permissionBits = 0777;
-
-std::string parentOf(std::string const& path)
-{
-    return path.substr(0, path.rfind('/') + 1);
-}
-
-std::string nameOf(std::string const& path)
-{
-    return path.substr(path.rfind('/') + 1);
-}
 
 } // namespace
 

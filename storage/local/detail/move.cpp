@@ -3,6 +3,7 @@
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/fileSystem.hpp>
 #include <storage/local/detail/moveAcross.hpp>
+#include <storage/local/detail/nativePath.hpp>
 #include <storage/local/detail/scratchName.hpp>
 
 #include <cerrno>
@@ -39,16 +40,6 @@ struct Move
     Located target;
 };
 
-std::size_t nameStart(std::string const& path)
-{
-    return path.rfind('/') + 1;
-}
-
-std::string parentOf(std::string const& path)
-{
-    return path.substr(0, nameStart(path));
-}
-
 /// The end of a move that is to blame for an error that does not say.
 StorageIRI const& culprit(int error, Move const& move)
 {
@@ -78,7 +69,7 @@ bool isSameEntry(Move const& move)
 {
     Status from;
     Status to;
-    return move.fromPath.substr(nameStart(move.fromPath)) == move.toPath.substr(nameStart(move.toPath)) &&
+    return nameOf(move.fromPath) == nameOf(move.toPath) &&
            move.root.getStatus(parentOf(move.fromPath), Links::Follow, from) == 0 &&
            move.root.getStatus(parentOf(move.toPath), Links::Follow, to) == 0 && isSameFile(from, to);
 }

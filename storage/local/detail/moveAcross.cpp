@@ -4,6 +4,7 @@
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/move.hpp>
 #include <storage/local/detail/moveContent.hpp>
+#include <storage/local/detail/nativePath.hpp>
 #include <storage/local/detail/scratchName.hpp>
 #include <storage/local/detail/sync.hpp>
 
@@ -33,7 +34,7 @@ public:
             error = getFullStatus(at(), Links::Keep, status_);
         // To find that out when all is copied would be late.
         if (error == 0)
-            error = root.checkAccess(path.substr(0, path.rfind('/') + 1), W_OK | X_OK);
+            error = root.checkAccess(parentOf(path), W_OK | X_OK);
         if (error != 0)
             throwError(error, iri_);
     }

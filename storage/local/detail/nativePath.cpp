@@ -62,4 +62,14 @@ std::string nativePath(StorageIRI const& iri)
     return path;
 }
 
+std::string parentOf(std::string const& path)
+{
+    return path.substr(0, path.rfind('/') + 1);
+}
+
+std::string nameOf(std::string const& path)
+{
+    return path.substr(path.rfind('/') + 1);
+}
+
 } // namespace foundation::storage::local::detail

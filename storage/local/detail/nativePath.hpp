@@ -14,4 +14,10 @@ namespace foundation::storage::local::detail {
 /// surrogate.
 FOUNDATION_API std::string nativePath(provider::StorageIRI const& iri);
 
+/// Such a path up to its last slash, that slash included.
+FOUNDATION_API std::string parentOf(std::string const& path);
+
+/// What follows the last slash of such a path; empty for the root.
+FOUNDATION_API std::string nameOf(std::string const& path);
+
 } // namespace foundation::storage::local::detail

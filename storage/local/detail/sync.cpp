@@ -3,6 +3,7 @@
 #include <storage/local/DurabilityException.hpp>
 #include <storage/local/detail/SystemCalls.hpp>
 #include <storage/local/detail/errorCode.hpp>
+#include <storage/local/detail/nativePath.hpp>
 
 #include <cerrno>
 
@@ -15,11 +16,6 @@ namespace {
 bool meansNotByItself(int error)
 {
     return error == EINVAL || error == ENOSYS || error == EOPNOTSUPP;
-}
-
-std::string parentOf(std::string const& path)
-{
-    return path.substr(0, path.rfind('/') + 1);
 }
 
 /// A folder that the user may write to but not read cannot be synced by itself; an entry that was in it leads to its

@@ -112,5 +112,15 @@ TEST(NativePath, KeepsWhatANameHoldsOfTheSyntaxOfLocations)
         EXPECT_EQ(nativePath(StorageIRI(folder, name)), "/tmp/" + std::string(name.begin(), name.end()));
 }
 
+TEST(NativePath, IsSplitAtItsLastSlash)
+{
+    EXPECT_EQ(parentOf("/a/b c"), "/a/");
+    EXPECT_EQ(nameOf("/a/b c"), "b c");
+    EXPECT_EQ(parentOf("/a"), "/");
+    EXPECT_EQ(nameOf("/a"), "a");
+    EXPECT_EQ(parentOf("/"), "/");
+    EXPECT_EQ(nameOf("/"), "");
+}
+
 } // namespace
 } // namespace foundation::storage::local::detail
