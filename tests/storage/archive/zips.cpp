@@ -34,6 +34,8 @@ void addMember(zip_t* zip, ZipMember const& member)
 
 std::string makeZip(std::vector<ZipMember> const& members)
 {
+    if (members.empty()) // libzip makes nothing of nothing, where others write the end of a directory
+        return std::string("PK\x05\x06", 4) + std::string(18, '\0');
     zip_error_t error;
     zip_error_init(&error);
     zip_source_t* const buffer = zip_source_buffer_create(nullptr, 0, 0, &error);
@@ -43,8 +45,6 @@ std::string makeZip(std::vector<ZipMember> const& members)
     for (ZipMember const& member : members)
         addMember(zip, member);
     require(zip_close(zip) == 0, "close");
-    if (members.empty()) // libzip makes nothing of nothing, where others write the end of a directory
-        return std::string("PK\x05\x06", 4) + std::string(18, '\0');
     zip_stat_t stat;
     require(zip_source_stat(buffer, &stat) == 0 && zip_source_open(buffer) == 0, "find out the size");
     std::string bytes(stat.size, '\0');
