@@ -25,7 +25,7 @@ struct Settings;
 /// extended attributes and what is refused: see the README beside this header.
 ///
 /// Errors: `Exception`; for streams in use `ByteStreamFailure`. `InvalidLocation` where a location names no local file.
-/// Settings: `durability` and `root`; see the README. `configure` throws `std::invalid_argument` for what it does not
+/// Settings: `durability`, `preserve` and `root`; see the README. `configure` throws `std::invalid_argument` for what it does not
 /// understand, and changes nothing then. What is open keeps the settings that it was opened with.
 /// Threads: any number at once, with `configure` too. A stream or listing belongs to one thread at a time.
 /// Change events come in a thread of the provider; see the README for what callbacks may do.

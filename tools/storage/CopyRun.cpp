@@ -145,6 +145,24 @@ void CopyRun::tell(std::string const& line)
         session_.printName(line);
 }
 
+/// A report comes after those of all that was asked for before, which would change the time again.
+void CopyRun::finishFolder(Place source, Place target, bool isNew)
+{
+    if (!isNew && !options_.files.keepsMetadata)
+        return;
+    FolderEnd const end{std::move(source), std::move(target), isNew, options_.files.keepsMetadata};
+    workers_.add([this, end](WorkerContext&) { return [this, end] { report(end); }; });
+}
+
+void CopyRun::report(FolderEnd const& end)
+{
+    try {
+        end.finish();
+    } catch (Failure const& failure) {
+        reportOf(failure, failedTransfer(end.source, end.target, failure))();
+    }
+}
+
 bool CopyRun::finish()
 {
     workers_.finish();

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <tools/storage/FileCopier.hpp>
+#include <tools/storage/FolderEnd.hpp>
 #include <tools/storage/OrderedWorkers.hpp>
 #include <tools/storage/Place.hpp>
 #include <tools/storage/Session.hpp>
@@ -54,6 +55,10 @@ public:
     /// Has the file at `source` copied, sooner or later. Throws `Interrupted`.
     void copyFile(Place source, Place target, TargetState state);
 
+    /// Gives the copy of a folder what it has of its source, when all that was asked for before is done; `isNew` says
+    /// that the copy was made by this run. Throws `Interrupted`.
+    void finishFolder(Place source, Place target, bool isNew);
+
     /// What is copied from now on is of another folder than what was copied before.
     void changeFolder() { workers_.beginGroup(); }
 
@@ -78,6 +83,7 @@ private:
     OrderedWorkers::Report copy(Place const& source, Place const& target, TargetState state, WorkerContext& context);
     OrderedWorkers::Report reportOf(Failure failure, Transfer const& transfer);
 
+    void report(FolderEnd const& end);
     void record(CopiedFile const& file, std::string const& line);
     void tell(std::string const& line);
 

@@ -3,7 +3,9 @@
 #include <tools/storage/AtomicFile.hpp>
 #include <tools/storage/PlainFile.hpp>
 #include <tools/storage/describe.hpp>
+#include <tools/storage/explain.hpp>
 #include <tools/storage/interrupt.hpp>
+#include <tools/storage/physicalPath.hpp>
 #include <tools/storage/readSome.hpp>
 
 #include <algorithm>
@@ -15,6 +17,8 @@
 #include <utility>
 
 namespace foundation::storage::tool {
+
+using boost::posix_time::ptime;
 
 namespace {
 
@@ -94,7 +98,27 @@ std::optional<std::uint64_t> sizeIfUpToDate(Place const& source, Place const& ta
     return isUpToDate ? std::optional(original.getSize()) : std::nullopt;
 }
 
+/// Local files that are copied by their store have it already, to the nanosecond.
+std::optional<ptime> timeToKeep(Place const& source, bool isCopiedInStore, CopyOptions const& options)
+{
+    if (!options.keepsMetadata || (isCopiedInStore && isLocal(source)))
+        return std::nullopt;
+    return at(source, [&] { return source.item().getFileAttributes().getLastModified(); });
+}
+
 } // namespace
+
+void keepTime(std::optional<ptime> const& time, Place const& copy)
+{
+    if (!time || time->is_special())
+        return;
+    try {
+        copy.item().setLastModified(*time);
+    } catch (provider::Exception const& error) {
+        if (error.getErrorCode() != provider::ErrorCode::UnsupportedOperation)
+            throw Failure{copy.text(), "in place, without the time of its source: " + explain(error)};
+    }
+}
 
 void requireFileTarget(Place const& target, Kind kind, Replace replace)
 {
@@ -136,7 +160,9 @@ CopiedFile FileCopier::copy(Place const& source, Place const& target, TargetStat
         throw Failure{target.text(), "a link, through which nothing is written"};
     bool const copiesItself = !options_.isInPlace && source.item().hasSameProviderInstance(target.item()) &&
                               source.item().hasFeature(provider::ExtendedFeature::AtomicFileCopy);
+    std::optional<ptime> const time = timeToKeep(source, copiesItself, options_);
     std::uint64_t const size = copiesItself ? copyInStore(source, target, context) : transfer(source, target, context);
+    keepTime(time, target);
     progress_.addFile();
     return {size, false};
 }

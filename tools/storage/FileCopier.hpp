@@ -7,7 +7,9 @@
 #include <tools/storage/TargetFile.hpp>
 #include <tools/storage/kinds.hpp>
 
+#include <boost/date_time/posix_time/posix_time_types.hpp>
 #include <cstdint>
+#include <optional>
 
 namespace foundation::storage::tool {
 
@@ -16,6 +18,10 @@ struct CopyOptions
     Replace replace = Replace::Never;
     bool isInPlace = false; ///< each file is written at its target; otherwise it appears there whole or not at all
     bool isUpdate = false;  ///< what is up to date already is passed over
+
+    /// The time of the last change is kept where the target can, and what else stores keep that copy by themselves once
+    /// they are told.
+    bool keepsMetadata = false;
 };
 
 /// What became of a file.
@@ -57,6 +63,9 @@ private:
     Progress& progress_;
     CopyOptions options_;
 };
+
+/// Gives a copy the time of its source; does nothing where a store cannot, or the source has none. Throws `Failure`.
+void keepTime(std::optional<boost::posix_time::ptime> const& time, Place const& copy);
 
 /// Throws `Failure` unless a file may be put at `target`, where `kind` stands: nothing, or a file that may be replaced.
 void requireFileTarget(Place const& target, Kind kind, Replace replace);

@@ -10,7 +10,6 @@
 #include <tools/storage/describe.hpp>
 #include <tools/storage/explain.hpp>
 
-#include <boost/property_tree/ptree.hpp>
 #include <cerrno>
 #include <fmt/format.h>
 #include <memory>
@@ -84,24 +83,28 @@ std::string explain(provider::Exception const& error, std::string const& argumen
     return tool::explain(error);
 }
 
-boost::property_tree::ptree localDurability(char const* durability)
-{
-    boost::property_tree::ptree settings;
-    settings.put("file.durability", durability);
-    return settings;
-}
-
 } // namespace
 
 Stores::Stores()
 {
     registry::registerAll(registry_);
-    registry_.configure(localDurability("none"));
+    set("file.durability", "none");
+}
+
+void Stores::set(char const* setting, char const* value)
+{
+    settings_.put(setting, value);
+    registry_.configure(settings_);
 }
 
 void Stores::syncAll()
 {
-    registry_.configure(localDurability("full"));
+    set("file.durability", "full");
+}
+
+void Stores::keepMetadata()
+{
+    set("file.preserve", "times,xattrs");
 }
 
 provider::StorageItem Stores::openItem(std::string const& argument) const

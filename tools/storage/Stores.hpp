@@ -4,6 +4,7 @@
 #include <storage/registry/Registry.hpp>
 #include <tools/storage/Place.hpp>
 
+#include <boost/property_tree/ptree.hpp>
 #include <string>
 
 namespace foundation::storage::tool {
@@ -18,6 +19,9 @@ public:
     /// done.
     void syncAll();
 
+    /// From now on local files are copied with the times of their last change and their extended attributes.
+    void keepMetadata();
+
     registry::Registry const& registry() const { return registry_; }
 
     /// The item that an argument names: an IRI, or a local path, relative ones taken from the working directory.
@@ -28,6 +32,9 @@ public:
     Place open(std::string const& argument) const { return Place(openItem(argument), argument); }
 
 private:
+    void set(char const* setting, char const* value);
+
+    boost::property_tree::ptree settings_;
     registry::Registry registry_;
 };
 

@@ -1,5 +1,6 @@
 #include <tools/storage/TreeCopier.hpp>
 
+#include <tools/storage/FolderEnd.hpp>
 #include <tools/storage/describe.hpp>
 #include <tools/storage/interrupt.hpp>
 #include <tools/storage/scratchName.hpp>
@@ -52,6 +53,7 @@ void TreeCopier::step()
         run_.fail(level.folder(), level.counterpart(), failure);
         return;
     }
+    run_.finishFolder(level.folder(), level.counterpart(), level.isFresh);
     levels_.leave();
     run_.changeFolder();
 }
@@ -77,6 +79,8 @@ void TreeCopier::enter(Place const& source, Place const& target)
         requireCopyable(source);
         levels_.enter(source, target);
         levels_.innermost().isFresh = makeFolder(target);
+        if (levels_.innermost().isFresh)
+            beginFolder(source, target);
         run_.changeFolder();
     } catch (Failure const& failure) {
         if (levels_.depth() > depth)

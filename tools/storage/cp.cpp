@@ -21,6 +21,7 @@ struct Options
     bool replaces = false;
     bool isUpdate = false;
     bool isInPlace = false;
+    bool keepsMetadata = false;
     TransferOptions transfers;
 };
 
@@ -30,6 +31,7 @@ CopyRunOptions runOptions(Options const& options)
     result.files.replace = options.replaces || options.isUpdate ? Replace::Files : Replace::Never;
     result.files.isInPlace = options.isInPlace;
     result.files.isUpdate = options.isUpdate;
+    result.files.keepsMetadata = options.keepsMetadata;
     result.telling = tellingOf(options.transfers);
     result.jobs = jobsOf(options.transfers);
     return result;
@@ -96,6 +98,8 @@ void copyAll(Session& session, Options const& options)
 {
     if (options.transfers.isSynced)
         session.stores().syncAll();
+    if (options.keepsMetadata)
+        session.stores().keepMetadata();
     std::vector<std::string> sources = options.paths;
     Place target = session.stores().open(sources.back());
     sources.pop_back();
@@ -113,10 +117,13 @@ Action defineCp(CLI::App& app)
     addFlag(app, "--replace", options->replaces, "Replace files at the target; folders are never replaced");
     addFlag(app, "-u,--update", options->isUpdate,
             "Pass over files that are up to date at the target (of the same size, and no older), and replace others");
+    addFlag(app, "-p,--preserve", options->keepsMetadata,
+            "Keep the times of the last change, and of local files extended attributes too");
     addFlag(app, "--in-place", options->isInPlace,
             "Write into the file at the target itself: what fails half-way leaves half of it");
     addTransferOptions(app, "Name each file that was copied", options->transfers);
     exclude(app, "--sync", "--in-place");
+    exclude(app, "--preserve", "--in-place");
     addOperands(app, "SOURCE... TARGET", "What to copy, and the folder that receives it, or its new name", 2,
                 options->paths);
     return [options](Session& session) { copyAll(session, *options); };

@@ -117,6 +117,7 @@ CopyRunOptions runOptions(Options const& options, Replace replace)
 {
     CopyRunOptions result;
     result.files.replace = replace;
+    result.files.keepsMetadata = true;
     result.links = FileLinks::Refuse;
     result.telling = options.transfers.isJSON ? Telling::JSON : Telling::Nothing;
     result.jobs = jobsOf(options.transfers);
@@ -208,6 +209,7 @@ bool Move::moveByCopying(Place const& source, Kind kind, Place const& target)
 {
     // The source goes: its copy must not be lost with the power.
     session_.stores().syncAll();
+    session_.stores().keepMetadata();
     if (kind == Kind::RegularFile)
         return moveFileByCopying(source, target);
     if (kind != Kind::RegularFolder)

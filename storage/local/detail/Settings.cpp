@@ -22,6 +22,26 @@ Durability toDurability(std::string const& text)
     throw std::invalid_argument("durability: \"" + text + "\" is neither \"none\", \"file\" nor \"full\"");
 }
 
+/// An empty text preserves nothing.
+Preserved toPreserved(std::string const& text)
+{
+    Preserved preserved;
+    if (text.empty())
+        return preserved;
+    std::size_t end = 0;
+    for (std::size_t start = 0; end != std::string::npos; start = end + 1) {
+        end = text.find(',', start);
+        std::string const name = text.substr(start, end == std::string::npos ? end : end - start);
+        if (name == "times")
+            preserved.times = true;
+        else if (name == "xattrs")
+            preserved.extendedAttributes = true;
+        else
+            throw std::invalid_argument("preserve: \"" + name + "\" is neither \"times\" nor \"xattrs\"");
+    }
+    return preserved;
+}
+
 Root toRoot(std::string const& path)
 {
     try {
@@ -40,6 +60,8 @@ Settings::Settings(ptree const& tree)
             throw std::invalid_argument(key + ": stands there twice");
         if (key == "durability")
             durability = toDurability(value.data());
+        else if (key == "preserve")
+            preserved = toPreserved(value.data());
         else if (key == "root")
             root = toRoot(value.data());
         else

@@ -13,6 +13,7 @@ enum class CopyOutcome
     Aborted,
     SourceFailed,
     TargetFailed,
+    AttributesFailed, ///< the target takes the content, and not the extended attributes
 };
 
 struct CopyResult

@@ -2,7 +2,9 @@
 
 #include <storage/local/detail/ScratchFile.hpp>
 #include <storage/local/detail/copyContent.hpp>
+#include <storage/local/detail/copyFailure.hpp>
 #include <storage/local/detail/errorCode.hpp>
+#include <storage/local/detail/metadata.hpp>
 #include <storage/local/detail/move.hpp>
 #include <storage/local/detail/openRegularFile.hpp>
 #include <storage/provider/Exception.hpp>
@@ -89,6 +91,18 @@ bool leadsToSource(Copy const& copy, OpenedFile const& source)
     return target && isSameFile(source.status, *target);
 }
 
+CopyResult preserve(Preserved const& preserved, OpenedFile const& source, FileDescriptor const& target)
+{
+    CopyResult result;
+    if (preserved.extendedAttributes)
+        result = keepUserAttributes(source.file.get(), target.get());
+    if (!preserved.times || result.outcome != CopyOutcome::Completed)
+        return result;
+    statx_timestamp const& time = source.status.stx_mtime;
+    int const error = setModified(target, {.tv_sec = time.tv_sec, .tv_nsec = time.tv_nsec});
+    return error == 0 ? result : CopyResult{CopyOutcome::TargetFailed, error};
+}
+
 } // namespace
 
 void copyFile(Settings const& settings, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
@@ -100,7 +114,10 @@ void copyFile(Settings const& settings, StorageIRI const& from, StorageIRI const
     if (isSameFile(source.status, target.status))
         return;
     CopyResult const result = copyContent(source.file, source.status, target.file, {});
-    if (int const error = result.error != 0 ? result.error : target.file.close())
+    if (result.error != 0)
+        throwError(result.error, from);
+    requireCopied(preserve(settings.preserved, source, target.file), from, to);
+    if (int const error = target.file.close())
         throwError(error, from);
 }
 
@@ -117,8 +134,8 @@ TransactionStatus copyFileAtomic(Settings const& settings, StorageIRI const& fro
     CopyResult const result = copyContent(source.file, source.status, scratch.file(), interrupt);
     if (result.outcome == CopyOutcome::Aborted)
         return TransactionStatus::Aborted;
-    if (result.error != 0)
-        throwError(result.error, result.outcome == CopyOutcome::SourceFailed ? from : to);
+    requireCopied(result, from, to);
+    requireCopied(preserve(settings.preserved, source, scratch.file()), from, to);
     scratch.commit(policy);
     return TransactionStatus::Completed;
 }

@@ -10,7 +10,8 @@
 namespace foundation::storage::local::detail {
 
 // A file that the copy makes has the permission bits of its source less the umask; one that was there keeps its own. A
-// file copied onto itself, also through a link or another name, stays as it is.
+// file copied onto itself, also through a link or another name, stays as it is. What the setting `preserve` names is
+// kept too; what the target cannot keep fails there.
 //
 // Errors: `Exception`. What stands in the way at the target comes before what is wrong with the source.
 

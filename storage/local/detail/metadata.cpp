@@ -14,6 +14,7 @@ namespace {
 
 constexpr mode_t settableBits = 07777;
 constexpr mode_t setIdBits = 06000;
+constexpr std::string_view prefixOfUser = "user.";
 
 /// Nobody but the superuser gives files away, and some file systems keep neither owners nor permissions.
 bool isNotForUs(int error)
@@ -77,7 +78,36 @@ CopyResult keepAttribute(int source, int target, char const* name, char* value)
     if (error != 0)
         return {CopyOutcome::SourceFailed, error};
     error = errorOf([&] { return systemCalls().fsetxattr(target, name, value, size, 0); });
-    return error == 0 ? CopyResult() : CopyResult{CopyOutcome::TargetFailed, error};
+    return error == 0 ? CopyResult() : CopyResult{CopyOutcome::AttributesFailed, error};
+}
+
+CopyResult keepAttributes(int source, int target, char const* names, char const* end)
+{
+    auto const value = std::make_unique_for_overwrite<char[]>(maximumAttributeSize);
+    for (char const* name = names; name < end; name += std::strlen(name) + 1) {
+        if (!std::string_view(name).starts_with(prefixOfUser))
+            continue;
+        CopyResult const result = keepAttribute(source, target, name, value.get());
+        if (result.outcome != CopyOutcome::Completed)
+            return result;
+    }
+    return {};
+}
+
+/// Who may not write a file may not give it attributes either, however it was opened.
+CopyResult keepAttributesOfReadOnly(int source, int target, char const* names, char const* end)
+{
+    Status status;
+    int error = getStatusOf(target, status);
+    mode_t const mode = status.stx_mode & settableBits;
+    if (error != 0 || (mode & S_IWUSR) != 0)
+        return {CopyOutcome::AttributesFailed, error != 0 ? error : EACCES};
+    error = errorOf([&] { return systemCalls().fchmod(target, mode | S_IWUSR); });
+    if (error != 0)
+        return {CopyOutcome::AttributesFailed, error};
+    CopyResult const result = keepAttributes(source, target, names, end);
+    error = errorOf([&] { return systemCalls().fchmod(target, mode); });
+    return error == 0 ? result : CopyResult{CopyOutcome::TargetFailed, error};
 }
 
 } // namespace
@@ -126,15 +156,9 @@ CopyResult keepUserAttributes(int source, int target)
         return {};
     if (error != 0)
         return {CopyOutcome::SourceFailed, error};
-    auto const value = std::make_unique_for_overwrite<char[]>(maximumAttributeSize);
-    for (char const* name = names.get(); name < names.get() + end; name += std::strlen(name) + 1) {
-        if (!std::string_view(name).starts_with("user."))
-            continue;
-        CopyResult const result = keepAttribute(source, target, name, value.get());
-        if (result.outcome != CopyOutcome::Completed)
-            return result;
-    }
-    return {};
+    CopyResult const result = keepAttributes(source, target, names.get(), names.get() + end);
+    bool const isReadOnly = result.outcome == CopyOutcome::AttributesFailed && result.error == EACCES;
+    return isReadOnly ? keepAttributesOfReadOnly(source, target, names.get(), names.get() + end) : result;
 }
 
 } // namespace foundation::storage::local::detail

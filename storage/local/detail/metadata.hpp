@@ -19,7 +19,8 @@ namespace foundation::storage::local::detail {
 [[nodiscard]] int keepTimes(int file, Status const& source);
 [[nodiscard]] int keepTimesOfLink(At const& link, Status const& source);
 
-/// The extended attributes of the user. Those that this user may not read are left out.
+/// The extended attributes of the user, beside those that the target has. Those that this user may not read are left
+/// out.
 CopyResult keepUserAttributes(int source, int target);
 
 } // namespace foundation::storage::local::detail

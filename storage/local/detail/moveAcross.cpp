@@ -1,6 +1,7 @@
 #include <storage/local/detail/moveAcross.hpp>
 
 #include <storage/local/detail/ScratchFile.hpp>
+#include <storage/local/detail/copyFailure.hpp>
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/move.hpp>
 #include <storage/local/detail/moveContent.hpp>
@@ -119,18 +120,12 @@ void requireReplaceable(Root const& root, Status const& source, StorageIRI const
         throwError(EXDEV, to);
 }
 
-void requireMoved(CopyResult const& result, StorageIRI const& from, StorageIRI const& to)
-{
-    if (result.outcome != CopyOutcome::Completed)
-        throwError(result.error, result.outcome == CopyOutcome::SourceFailed ? from : to);
-}
-
 void copyRegularFile(Root const& root, Source& source, StorageIRI const& to, ReplacementPolicy policy)
 {
     FileDescriptor file;
     source.open(file);
     ScratchFile scratch(root, to, Durability::Full, O_RDWR, privateMode, Permissions::Own);
-    requireMoved(moveContent(file, source.status(), scratch.file()), source.iri(), to);
+    requireCopied(moveContent(file, source.status(), scratch.file()), source.iri(), to);
     source.requireUnchanged();
     scratch.commit(policy);
 }
@@ -143,7 +138,7 @@ void copyLink(Root const& root, Source const& source, StorageIRI const& to, Repl
     if (int const error = root.openParent(path, folder, name))
         throwError(error, to);
     ScratchLink scratch(folder);
-    requireMoved(moveLink(source.at(), source.status(), scratch.at()), source.iri(), to);
+    requireCopied(moveLink(source.at(), source.status(), scratch.at()), source.iri(), to);
     if (int const error = scratch.putInPlace({folder.get(), name.c_str()}, policy))
         throwError(error, to);
     if (int const error = syncFolderOf(root, path))

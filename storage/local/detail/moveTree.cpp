@@ -3,6 +3,7 @@
 #include <fl/filesystem/native_name.hpp>
 #include <storage/local/detail/FolderChain.hpp>
 #include <storage/local/detail/TreeRemoval.hpp>
+#include <storage/local/detail/copyFailure.hpp>
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/metadata.hpp>
 #include <storage/local/detail/move.hpp>
@@ -286,7 +287,7 @@ void TreeCopy::require(CopyResult const& result, std::string const& entry) const
 {
     if (result.outcome == CopyOutcome::SourceFailed)
         walk_.fail(result.error, entry);
-    requireAtTarget(result.error);
+    requireCopied(result, target_.iri, target_.iri);
 }
 
 void TreeCopy::enter(Status const& folder)

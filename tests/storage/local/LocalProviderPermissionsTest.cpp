@@ -6,6 +6,7 @@
 #include <tests/support/failureOf.hpp>
 
 #include <array>
+#include <boost/property_tree/ptree.hpp>
 #include <cstdlib>
 #include <exception>
 #include <filesystem>
@@ -14,6 +15,7 @@
 #include <stdexcept>
 #include <string>
 #include <sys/wait.h>
+#include <sys/xattr.h>
 #include <unistd.h>
 
 namespace foundation::storage::local {
@@ -135,6 +137,24 @@ TEST_F(LocalProviderPermissions, AreNeededToChangeAFolder)
     expectDenied([&] { provider.removeFile(at(u"unwritable/file")); }, u"unwritable/file");
     expectDenied([&] { provider.removeFolder(at(u"open")); }, u"open");
     expectDenied([&] { provider.openStream(at(u"unwritable/new"), {}); }, u"unwritable/new");
+}
+
+TEST_F(LocalProviderPermissions, OfAReadOnlyFileDoNotKeepItsCopyFromHavingAttributes)
+{
+    if (::setxattr((folder / "unwritable file").c_str(), "user.colour", "red", 3, 0) != 0)
+        GTEST_SKIP() << "the folder for temporary files has no extended attributes";
+    boost::property_tree::ptree settings;
+    settings.put("preserve", "xattrs");
+    LocalProvider keeping;
+    keeping.configure(settings);
+    EXPECT_EQ(askedByNobody([&] {
+                  keeping.copyFileAtomic(at(u"unwritable file"), at(u"open/copy"), ReplacementPolicy::Preserve, {});
+                  return std::string("done");
+              }),
+              "done");
+    std::array<char, 8> value;
+    EXPECT_EQ(::getxattr((folder / "open/copy").c_str(), "user.colour", value.data(), value.size()), 3);
+    EXPECT_EQ(fs::status(folder / "open/copy").permissions(), fs::perms(0444));
 }
 
 TEST_F(LocalProviderPermissions, AreNeededToOpenAFile)

@@ -2,6 +2,8 @@
 
 #include <tests/support/Process.hpp>
 
+#include <sys/stat.h>
+
 namespace {
 
 using foundation::tests::support::runProgram;
@@ -45,6 +47,20 @@ TEST_F(Archive, IsCopiedOutAsItWasPacked)
 {
     runWell({"cp", "-r", inside("/"), "out"});
     EXPECT_TRUE(areEqual("tree", "out"));
+}
+
+TEST_F(Archive, GivesItsTimesToCopiesThatAreToKeepThem)
+{
+    constexpr long time = 1'100'000'000;
+    setTime("tree/docs/a b.txt", time);
+    setTime("tree/docs", time);
+    pack({"/usr/bin/env", "zip", "-qr", "../aged.zip", "docs"}, "tree");
+    runWell({"cp", "-rp", "zip:file://" + (folder / "aged.zip").string() + "!/docs", "out"});
+    struct stat status = {};
+    for (char const* const name : {"out/a b.txt", "out"}) {
+        EXPECT_EQ(::stat((folder / name).c_str(), &status), 0);
+        EXPECT_EQ(status.st_mtim.tv_sec, time) << name;
+    }
 }
 
 TEST_F(Archive, IsSearchedCountedAndDescribed)

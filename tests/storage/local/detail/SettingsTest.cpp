@@ -48,6 +48,18 @@ TEST(LocalSettings, TakeEachDurability)
         EXPECT_EQ(Settings(tree("durability", text)).durability, durability);
 }
 
+TEST(LocalSettings, TakeWhatCopiesPreserve)
+{
+    Preserved const nothing = Settings(tree("preserve", "")).preserved;
+    EXPECT_FALSE(nothing.times || nothing.extendedAttributes);
+    Preserved const times = Settings(tree("preserve", "times")).preserved;
+    EXPECT_TRUE(times.times && !times.extendedAttributes);
+    Preserved const both = Settings(tree("preserve", "xattrs,times")).preserved;
+    EXPECT_TRUE(both.times && both.extendedAttributes);
+    for (std::string const text : {"times,", ",times", "Times", "times xattrs"})
+        EXPECT_TRUE(refusalOf(tree("preserve", text)).starts_with("preserve: \"")) << text;
+}
+
 TEST(LocalSettings, TakeARoot)
 {
     TemporaryFolder const folder;
