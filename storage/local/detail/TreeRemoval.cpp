@@ -100,6 +100,7 @@ private:
     void step();
     void readBatch();
     int removeName(char const* name) const;
+    int removeEmpty(char const* name) const;
     void removeFile(char const* name);
     void removeFolder(char const* name);
     void leave();
@@ -131,7 +132,7 @@ int TreeRemoval::enter(char const* name, int passes)
     int const error = chain_.enter(name, Mounts::Refuse);
     if (error == 0)
         levels_.push_back({.passes = passes + 1});
-    else if (error == EACCES && removeEmptyFolder({chain_.folder(), name}) == 0)
+    else if (error == EACCES && removeEmpty(name) == 0)
         return 0;
     return error == EXDEV ? EBUSY : error;
 }
@@ -176,8 +177,13 @@ void TreeRemoval::readBatch()
 int TreeRemoval::removeName(char const* name) const
 {
     At const entry{chain_.folder(), name};
-    int const error = mayRemove_ ? mayRemove_(entry) : 0;
-    return error != 0 ? error : detail::removeName(entry);
+    return mayRemove_ ? removeNameChecked(entry, mayRemove_) : detail::removeName(entry);
+}
+
+int TreeRemoval::removeEmpty(char const* name) const
+{
+    At const entry{chain_.folder(), name};
+    return mayRemove_ ? removeEmptyFolderChecked(entry, mayRemove_) : removeEmptyFolder(entry);
 }
 
 void TreeRemoval::removeFile(char const* name)
@@ -221,7 +227,7 @@ void TreeRemoval::leave()
 
 void TreeRemoval::removeEmptied(std::string const& name, Level const& emptied)
 {
-    int error = removeEmptyFolder({chain_.folder(), name.c_str()});
+    int error = removeEmpty(name.c_str());
     bool const isFull = error == ENOTEMPTY || error == EEXIST;
     if (isFull && emptied.hasChanged && emptied.passes < maximumPasses)
         error = enter(name.c_str(), emptied.passes);

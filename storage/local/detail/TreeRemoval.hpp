@@ -2,10 +2,10 @@
 
 #include <storage/local/detail/FileDescriptor.hpp>
 #include <storage/local/detail/Root.hpp>
+#include <storage/local/detail/checkedRemoval.hpp>
 #include <storage/local/detail/fileSystem.hpp>
 #include <storage/provider/StorageIRI.hpp>
 
-#include <functional>
 #include <string>
 #include <vector>
 
@@ -34,10 +34,8 @@ void removeTree(Root const& root, provider::StorageIRI const& folder);
 /// The same, but answers the failures that are wanted instead of throwing for entries that stay.
 std::vector<RemovalFailure> removeTree(Root const& root, provider::StorageIRI const& folder, Failures wanted);
 
-/// Asked of each file and link right before it is removed: 0, or the `errno` for which it stays.
-using MayRemove = std::function<int(At const& entry)>;
-
-/// The same for a folder by its name in an open one; failures are told of below `folder`.
+/// The same for a folder by its name in an open one; failures are told of below `folder`. `mayRemove`, if any, is asked
+/// of each file, link and emptied folder; nothing goes that it has not seen.
 void removeTree(FileDescriptor parent, std::string const& name, provider::StorageIRI const& folder,
                 MayRemove mayRemove = {});
 

@@ -1,6 +1,7 @@
 #include <storage/local/detail/moveAcross.hpp>
 
 #include <storage/local/detail/ScratchFile.hpp>
+#include <storage/local/detail/checkedRemoval.hpp>
 #include <storage/local/detail/copyFailure.hpp>
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/move.hpp>
@@ -66,8 +67,9 @@ public:
     void remove() const
     {
         requireUnchanged();
-        if (int const error = removeName(at()))
-            throwError(error, iri_);
+        auto const isCopied = [&](Status const& now) { return hasSameContent(status_, now) ? 0 : EBUSY; };
+        if (int const error = removeNameChecked(at(), isCopied))
+            throwError(error == ENOENT || error == EISDIR ? EBUSY : error, iri_);
     }
 
 private:

@@ -131,8 +131,13 @@ CopyResult finishLink(At const& link, Status const& source, std::string const& t
 
 bool isUnchanged(Status const& before, Status const& now)
 {
+    return hasSameContent(before, now) && isSameTime(before.stx_ctime, now.stx_ctime);
+}
+
+bool hasSameContent(Status const& before, Status const& now)
+{
     return isSameFile(before, now) && before.stx_mode == now.stx_mode && before.stx_size == now.stx_size &&
-           isSameTime(before.stx_mtime, now.stx_mtime) && isSameTime(before.stx_ctime, now.stx_ctime);
+           isSameTime(before.stx_mtime, now.stx_mtime);
 }
 
 /// A difference is the fault of a source that changed meanwhile, if it did.

@@ -13,6 +13,9 @@ namespace foundation::storage::local::detail {
 /// Whether nobody has changed a file or link, nor anything about it but the time of its last access.
 bool isUnchanged(Status const& before, Status const& now);
 
+/// Whether it is the same file with the same content and permissions; its names may have changed.
+bool hasSameContent(Status const& before, Status const& now);
+
 /// Makes an open file, empty and for reading and writing, a copy of another: its content, owner, permissions, times and
 /// extended attributes of the user. Returns when the content is on the disk, and was read back from there and compared
 /// with that of the source; the times are not yet on the disk.

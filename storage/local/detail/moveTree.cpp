@@ -207,7 +207,7 @@ public:
                found->second.changed == file.stx_ctime.tv_sec && found->second.changedPart == file.stx_ctime.tv_nsec;
     }
 
-    /// Another name of the file may have gone since, which counts as a change of its attributes.
+    /// A name of the file may have gone or changed since, which counts as a change of its attributes.
     bool holdsContentOf(Status const& file) const
     {
         auto const found = stamps_.find(keyOf(file));
@@ -407,10 +407,9 @@ void copyTree(Tree const& source, Tree const& target, Copied& copied)
 /// What came into the source or changed there since it was compared is not in the copy: it stays.
 void removeCopied(Tree& source, Copied const& copied)
 {
-    removeTree(std::move(source.parent), source.name, source.iri, [&](At const& entry) {
-        Status status;
-        int const error = getFullStatus(entry, Links::Keep, status);
-        return error == 0 && !isFolder(status) && !copied.holdsContentOf(status) ? EBUSY : error;
+    removeTree(std::move(source.parent), source.name, source.iri, [&](Status const& entry) {
+        bool const isCopied = isFolder(entry) ? copied.holds(entry) : copied.holdsContentOf(entry);
+        return isCopied ? 0 : EBUSY;
     });
 }
 

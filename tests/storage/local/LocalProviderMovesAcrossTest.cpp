@@ -12,6 +12,7 @@
 #include <filesystem>
 #include <fstream>
 #include <string>
+#include <string_view>
 #include <sys/stat.h>
 #include <sys/xattr.h>
 #include <unistd.h>
@@ -21,6 +22,7 @@ namespace {
 
 namespace fs = std::filesystem;
 using namespace provider;
+using namespace std::string_view_literals;
 using detail::realSystemCalls;
 using tests::support::failure;
 using tests::support::failureOf;
@@ -210,6 +212,40 @@ TEST_F(LocalProviderMovesAcrossFileSystems, LeaveBothEndsWhenTheSourceChangesMea
     EXPECT_EQ(countIn(to), 1u);
 }
 
+fs::path newVersion;
+
+/// Renames the new version onto what changes, once, when that is about to be renamed or removed by its name.
+void replaceBefore(std::string_view name)
+{
+    if (name == changing.filename().native() && fs::exists(newVersion))
+        fs::rename(newVersion, changing);
+}
+
+void replaceChangingBeforeItGoes(ReplacedSystemCalls& replaced)
+{
+    replaced->renameat2 = [](int fromFolder, char const* old, int toFolder, char const* name, unsigned flags) {
+        replaceBefore(old);
+        return realSystemCalls.renameat2(fromFolder, old, toFolder, name, flags);
+    };
+    replaced->unlinkat = [](int folder, char const* path, int flags) {
+        replaceBefore(path);
+        return realSystemCalls.unlinkat(folder, path, flags);
+    };
+}
+
+TEST_F(LocalProviderMovesAcrossFileSystems, KeepASourceThatIsReplacedRightBeforeItGoes)
+{
+    changing = from.write("file", "content");
+    newVersion = from.write("new version", "new");
+    ReplacedSystemCalls replaced;
+    replaceChangingBeforeItGoes(replaced);
+    EXPECT_EQ(moveFile(u"file", u"new"), failure(ErrorCode::ResourceInUse, from.iri(u"file")));
+    EXPECT_EQ(from.read("file"), "new");
+    EXPECT_EQ(to.read("new"), "content");
+    EXPECT_EQ(countIn(from), 1u);
+    EXPECT_EQ(countIn(to), 1u);
+}
+
 TEST_F(LocalProviderMovesAcrossFileSystems, LeaveBothEndsWhenTheDiskHoldsSomethingElse)
 {
     from.write("file", "content");
@@ -353,12 +389,51 @@ TEST_F(LocalProviderFolderMovesAcrossFileSystems, KeepWhatCameIntoTheSourceAtThe
     ReplacedSystemCalls replaced;
     replaced->renameat2 = [](int fromFolder, char const* old, int toFolder, char const* name, unsigned flags) {
         int const result = realSystemCalls.renameat2(fromFolder, old, toFolder, name, flags);
-        if (result == 0)
+        if (result == 0 && name == "new"sv)
             appendToChanging();
         return result;
     };
     EXPECT_EQ(moveFolder(u"tree", u"new"), failure(ErrorCode::ResourceInUse, from.iri(u"tree/a/late")));
     EXPECT_EQ(from.read("tree/a/late"), "more");
+    EXPECT_EQ(to.read("new/a/b/inner"), "2");
+}
+
+TEST_F(LocalProviderFolderMovesAcrossFileSystems, KeepAnEmptyFolderThatCameIntoTheSourceAtTheLastMoment)
+{
+    changing = from / "tree/a/late";
+    ReplacedSystemCalls replaced;
+    replaced->renameat2 = [](int fromFolder, char const* old, int toFolder, char const* name, unsigned flags) {
+        int const result = realSystemCalls.renameat2(fromFolder, old, toFolder, name, flags);
+        if (result == 0 && name == "new"sv)
+            fs::create_directory(changing);
+        return result;
+    };
+    EXPECT_EQ(moveFolder(u"tree", u"new"), failure(ErrorCode::ResourceInUse, from.iri(u"tree/a/late")));
+    EXPECT_TRUE(fs::is_directory(from / "tree/a/late"));
+    EXPECT_FALSE(fs::exists(to / "new/a/late"));
+}
+
+TEST_F(LocalProviderFolderMovesAcrossFileSystems, KeepAnEntryThatIsReplacedRightBeforeItGoes)
+{
+    changing = from / "tree/a/b/inner";
+    newVersion = from.write("new version", "new");
+    ReplacedSystemCalls replaced;
+    replaceChangingBeforeItGoes(replaced);
+    EXPECT_EQ(moveFolder(u"tree", u"new"), failure(ErrorCode::ResourceInUse, from.iri(u"tree/a/b/inner")));
+    EXPECT_EQ(from.read("tree/a/b/inner"), "new");
+    EXPECT_EQ(to.read("new/a/b/inner"), "2");
+    EXPECT_EQ(std::distance(fs::directory_iterator(from / "tree/a/b"), fs::directory_iterator()), 1);
+}
+
+TEST_F(LocalProviderFolderMovesAcrossFileSystems, KeepAnEmptyFolderThatIsPutInPlaceOfAnotherRightBeforeThatGoes)
+{
+    changing = from / "tree/a/b";
+    newVersion = from / "new version";
+    fs::create_directory(newVersion);
+    ReplacedSystemCalls replaced;
+    replaceChangingBeforeItGoes(replaced);
+    EXPECT_EQ(moveFolder(u"tree", u"new"), failure(ErrorCode::ResourceInUse, from.iri(u"tree/a/b")));
+    EXPECT_TRUE(fs::is_directory(from / "tree/a/b"));
     EXPECT_EQ(to.read("new/a/b/inner"), "2");
 }
 
