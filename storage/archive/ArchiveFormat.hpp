@@ -6,6 +6,10 @@ namespace foundation::storage::archive {
 enum class ArchiveFormat
 {
     Zip,
+    Tar, ///< plain, or compressed as a whole by gzip, bzip2, xz, lzma or zstd
+    SevenZip,
+    Iso,  ///< ISO 9660 with Rock Ridge or Joliet
+    Cpio, ///< as Tar
 };
 
 } // namespace foundation::storage::archive

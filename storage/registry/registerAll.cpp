@@ -16,6 +16,10 @@ void registerArchives(Registry& registry)
 {
     using archive::ArchiveFormat;
     using archive::ArchiveProviderFactory;
+    registry.add(u"cpio", std::make_shared<ArchiveProviderFactory>(ArchiveFormat::Cpio));
+    registry.add(u"iso", std::make_shared<ArchiveProviderFactory>(ArchiveFormat::Iso));
+    registry.add(u"sevenzip", std::make_shared<ArchiveProviderFactory>(ArchiveFormat::SevenZip));
+    registry.add(u"tar", std::make_shared<ArchiveProviderFactory>(ArchiveFormat::Tar));
     registry.add(u"zip", std::make_shared<ArchiveProviderFactory>(ArchiveFormat::Zip));
 }
 #else

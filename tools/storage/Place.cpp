@@ -2,23 +2,13 @@
 
 #include <fl/filesystem/native_name.hpp>
 #include <fl/i18n/utf8.hpp>
+#include <tools/storage/schemeText.hpp>
 
-#include <algorithm>
 #include <utility>
 
 namespace foundation::storage::tool {
 
 namespace {
-
-bool isLetter(char c)
-{
-    return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z');
-}
-
-bool isSchemeCharacter(char c)
-{
-    return isLetter(c) || (c >= '0' && c <= '9') || c == '+' || c == '-' || c == '.';
-}
 
 std::string childText(std::string text, std::u16string const& name, provider::StorageItem const& item)
 {
@@ -33,10 +23,7 @@ std::string childText(std::string text, std::u16string const& name, provider::St
 
 bool isIRI(std::string const& argument)
 {
-    if (argument.empty() || !isLetter(argument.front()))
-        return false;
-    auto const end = std::find_if_not(argument.begin(), argument.end(), isSchemeCharacter);
-    return end != argument.end() && *end == ':';
+    return schemeLength(argument).has_value();
 }
 
 Place::Place(provider::StorageItem item, std::string text) : item_(std::move(item)), text_(std::move(text)) {}

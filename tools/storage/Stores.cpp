@@ -9,12 +9,12 @@
 #include <tools/storage/Failure.hpp>
 #include <tools/storage/describe.hpp>
 #include <tools/storage/explain.hpp>
+#include <tools/storage/schemeText.hpp>
 
 #include <cerrno>
 #include <fmt/format.h>
 #include <memory>
 #include <new>
-#include <span>
 #include <stdlib.h>
 #include <system_error>
 #include <unistd.h>
@@ -44,12 +44,9 @@ StorageIRI locationOfPath(std::string const& path)
     return StorageIRI(StorageIRI(u"file:///"), normal.string());
 }
 
-/// The text of an IRI, its scheme in lower case, so that no store has two names in one command.
-std::u16string textOfIRI(std::string argument)
+std::u16string textOfIRI(std::string const& argument)
 {
-    for (char& c : std::span(argument).first(argument.find(':')))
-        c = c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
-    return fl::i18n::from_utf8(argument, fl::i18n::Malformed::Throw);
+    return fl::i18n::from_utf8(withKnownSchemes(argument), fl::i18n::Malformed::Throw);
 }
 
 /// An argument as it may be shown to whoever sees the terminal.

@@ -1,5 +1,6 @@
 #include <storage/archive/detail/Archive.hpp>
 
+#include <storage/archive/detail/CursorArchive.hpp>
 #include <storage/archive/detail/Fault.hpp>
 #include <storage/archive/detail/Source.hpp>
 #include <storage/archive/detail/ZipArchive.hpp>
@@ -17,16 +18,26 @@ std::shared_ptr<Archive const> openArchive(ArchiveFormat format, provider::Stora
     switch (format) {
     case ArchiveFormat::Zip:
         return std::make_shared<ZipArchive>(source, limits, modified);
+    case ArchiveFormat::Tar:
+    case ArchiveFormat::SevenZip:
+    case ArchiveFormat::Iso:
+    case ArchiveFormat::Cpio:
+        return std::make_shared<CursorArchive>(format, source, limits, modified);
     }
     throw Fault(Reason::UnsupportedMethod);
+}
+
+void requireRatio(ArchiveLimits const& limits, std::uint64_t size, std::uint64_t sizeInArchive)
+{
+    if (size > limits.bytesOfAnyRatio && size / limits.ratio > sizeInArchive)
+        throw Fault(Reason::RatioTooHigh);
 }
 
 void requireWithinLimits(ArchiveLimits const& limits, std::uint64_t size, std::uint64_t sizeInArchive)
 {
     if (size > limits.entryBytes)
         throw Fault(Reason::EntryTooLarge);
-    if (size > limits.bytesOfAnyRatio && size / limits.ratio > sizeInArchive)
-        throw Fault(Reason::RatioTooHigh);
+    requireRatio(limits, size, sizeInArchive);
 }
 
 } // namespace foundation::storage::archive::detail

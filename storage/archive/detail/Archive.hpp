@@ -22,6 +22,9 @@ public:
 
     Index const& index() const { return index_; }
 
+    /// Whether the archive is damaged behind what the index holds.
+    bool isIncomplete() const { return isIncomplete_; }
+
     /// The content of a file, from its beginning. Throws `Fault`; of limits, those on the content.
     virtual std::unique_ptr<Content> open(Index::Id file) const = 0;
 
@@ -30,11 +33,15 @@ public:
 
 protected:
     Index index_;
+    bool isIncomplete_ = false;
 };
 
 /// Reads the index of an archive. Errors: what opening the container throws; `Fault`.
 FOUNDATION_API std::shared_ptr<Archive const> openArchive(ArchiveFormat format, provider::StorageItem const& container,
                                                           ArchiveLimits const& limits);
+
+/// Throws `Fault` for what is more highly compressed than allowed.
+FOUNDATION_API void requireRatio(ArchiveLimits const& limits, std::uint64_t size, std::uint64_t sizeInArchive);
 
 /// Throws `Fault` for content that is larger, or more highly compressed, than allowed.
 FOUNDATION_API void requireWithinLimits(ArchiveLimits const& limits, std::uint64_t size, std::uint64_t sizeInArchive);

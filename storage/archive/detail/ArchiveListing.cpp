@@ -1,5 +1,6 @@
 #include <storage/archive/detail/ArchiveListing.hpp>
 
+#include <storage/archive/ArchiveException.hpp>
 #include <storage/archive/detail/time.hpp>
 
 #include <utility>
@@ -20,8 +21,10 @@ FolderAttributes folderAttributes(Node const& node)
     return FolderAttributes(toPtime(node.modified), false);
 }
 
-ArchiveListing::ArchiveListing(std::shared_ptr<Archive const> archive, Index::Id folder, Selection selection)
+ArchiveListing::ArchiveListing(std::shared_ptr<Archive const> archive, provider::StorageIRI const& container,
+                               Index::Id folder, Selection selection)
     : archive_(std::move(archive)),
+      container_(container),
       index_(archive_->index()),
       folder_(folder),
       selection_(std::move(selection)),
@@ -41,6 +44,8 @@ void ArchiveListing::next()
             return;
         }
     }
+    if (archive_->isIncomplete())
+        throw ArchiveException(ArchiveException::Reason::Damaged, container_);
 }
 
 void ArchiveListing::reset()

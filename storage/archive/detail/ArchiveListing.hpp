@@ -48,11 +48,12 @@ FOUNDATION_API provider::FolderAttributes folderAttributes(Node const& node);
 ///
 /// A link is listed as what it leads to; one that leads nowhere is a file with the attributes of the link. Below the
 /// folder, each subfolder comes right before what it holds, and names are paths from the folder that is listed; links
-/// are not entered.
+/// are not entered. Where the archive is damaged behind what could be read, the end is a failure that names it.
 class FOUNDATION_API ArchiveListing final : public provider::IFolderEntryIterator
 {
 public:
-    ArchiveListing(std::shared_ptr<Archive const> archive, Index::Id folder, Selection selection);
+    ArchiveListing(std::shared_ptr<Archive const> archive, provider::StorageIRI const& container, Index::Id folder,
+                   Selection selection);
 
     bool hasEntry() const override { return entry_.has_value(); }
     provider::FolderEntry const& entry() const override { return *entry_; }
@@ -66,6 +67,7 @@ private:
     provider::FolderEntry makeEntry() const;
 
     std::shared_ptr<Archive const> archive_;
+    provider::StorageIRI const container_;
     Index const& index_;
     Index::Id const folder_;
     Selection const selection_;

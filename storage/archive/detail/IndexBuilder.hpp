@@ -4,6 +4,8 @@
 #include <storage/archive/ArchiveLimits.hpp>
 #include <storage/archive/detail/Index.hpp>
 
+#include <cstdint>
+#include <limits>
 #include <map>
 #include <string>
 #include <string_view>
@@ -15,6 +17,8 @@ namespace foundation::storage::archive::detail {
 /// What an archive says of one entry.
 struct EntryRecord
 {
+    static constexpr std::int64_t unknownTime = std::numeric_limits<std::int64_t>::min();
+
     std::u16string_view path; ///< as in the archive, with whatever it holds
     EntryKind kind = EntryKind::File;
     std::uint64_t size = 0;

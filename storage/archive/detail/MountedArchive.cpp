@@ -116,6 +116,8 @@ Index::Id MountedArchive::require(Archive const& archive, StorageIRI const& iri)
     Index::Place const place = archive.index().find(iri.getPath(), LastLink::Follow);
     if (place.isLoop)
         throw Exception(ErrorCode::InvalidLocation, iri);
+    if (!place.id && archive.isIncomplete())
+        throw ArchiveException(Reason::Damaged, location_);
     if (!place.id || archive.index().at(*place.id).kind == EntryKind::HardLink)
         throw Exception(ErrorCode::ResourceNotFound, iri);
     return *place.id;
@@ -214,7 +216,7 @@ IProvider::Listing MountedArchive::list(StorageIRI const& folder, Selection sele
     requireInside(folder);
     ArchivePtr archive = upToDateArchive();
     Index::Id const id = requireFolder(*archive, folder);
-    return std::make_unique<ArchiveListing>(std::move(archive), id, std::move(selection));
+    return std::make_unique<ArchiveListing>(std::move(archive), location_, id, std::move(selection));
 }
 
 StorageIRI MountedArchive::canonicalLocation(StorageIRI const& iri) const

@@ -1,5 +1,6 @@
 #include <storage/archive/ArchiveProvider.hpp>
 
+#include <fl/filesystem/native_name.hpp>
 #include <storage/local/LocalProvider.hpp>
 #include <storage/provider/StorageItem.hpp>
 #include <tests/storage/archive/containers.hpp>
@@ -60,6 +61,22 @@ std::vector<Packer> packers()
         {"python bzip2", ArchiveFormat::Zip, {"python3", "-c", python("ZIP_BZIP2")}, false},
         {"7z", ArchiveFormat::Zip, {"7z", "a", "-tzip", "-snl", "../archive", "."}},
         {"bsdtar", ArchiveFormat::Zip, {"bsdtar", "--format", "zip", "-cf", "../archive", "."}},
+        {"bsdtar pax", ArchiveFormat::Tar, {"bsdtar", "--format", "pax", "-cf", "../archive", "."}},
+        {"bsdtar gnutar", ArchiveFormat::Tar, {"bsdtar", "--format", "gnutar", "-cf", "../archive", "."}},
+        {"bsdtar zstd", ArchiveFormat::Tar, {"bsdtar", "--zstd", "-cf", "../archive", "."}},
+        {"tar gnu", ArchiveFormat::Tar, {"tar", "--format", "gnu", "-cf", "../archive", "."}},
+        {"tar posix", ArchiveFormat::Tar, {"tar", "--format", "posix", "-cf", "../archive", "."}},
+        {"tar sparse", ArchiveFormat::Tar, {"tar", "--format", "posix", "-Scf", "../archive", "."}},
+        {"tar gnu sparse", ArchiveFormat::Tar, {"tar", "--format", "gnu", "-Scf", "../archive", "."}},
+        {"tar gzip", ArchiveFormat::Tar, {"tar", "-czf", "../archive", "."}},
+        {"tar bzip2", ArchiveFormat::Tar, {"tar", "-cjf", "../archive", "."}},
+        {"tar xz", ArchiveFormat::Tar, {"tar", "-cJf", "../archive", "."}},
+        {"7z 7z", ArchiveFormat::SevenZip, {"7z", "a", "-t7z", "-snl", "../archive", "."}},
+        {"bsdtar 7zip", ArchiveFormat::SevenZip, {"bsdtar", "--format", "7zip", "-cf", "../archive", "."}},
+        {"cpio", ArchiveFormat::Cpio, {"sh", "-c", "find . | cpio --quiet -o -H newc >../archive"}},
+        {"cpio odc gzip", ArchiveFormat::Cpio, {"sh", "-c", "find . | cpio --quiet -o -H odc | gzip >../archive"}},
+        {"bsdtar iso", ArchiveFormat::Iso, {"bsdtar", "--format", "iso9660", "-cf", "../archive", "."}},
+        {"genisoimage", ArchiveFormat::Iso, {"genisoimage", "-quiet", "-R", "-o", "../archive", "."}},
     };
 }
 
@@ -129,6 +146,16 @@ StorageItem localItem(StorageIRI const& iri)
     return StorageItem(std::make_shared<local::LocalProvider>(), iri);
 }
 
+/// Some programs add an ending.
+std::u16string nameOfArchive(TemporaryFolder const& folder)
+{
+    for (auto const* const ending : {".zip", ".7z"}) {
+        if (std::filesystem::exists(folder / (std::string("archive") + ending)))
+            return fl::filesystem::from_native_bytes(std::string("archive") + ending);
+    }
+    return u"archive";
+}
+
 TEST(ForeignArchive, IsReadAsTheTreeThatItWasMadeOf)
 {
     for (Packer const& packer : packers()) {
@@ -137,7 +164,7 @@ TEST(ForeignArchive, IsReadAsTheTreeThatItWasMadeOf)
         makeTree(folder);
         ProgramResult const made = pack(packer, folder);
         ASSERT_EQ(made.status, 0) << made.output << made.errors;
-        std::u16string const name = std::filesystem::exists(folder / "archive") ? u"archive" : u"archive.zip";
+        std::u16string const name = nameOfArchive(folder);
         StorageItem const root = openRoot(packer.format, localItem(folder.iri(name)));
         EXPECT_EQ(contentsOf(root, packer.keepsLinks), contentsOf(localItem(folder.iri(u"tree")), packer.keepsLinks));
     }
@@ -151,7 +178,7 @@ TEST(ForeignArchive, KeepsTimesToTheSecondOrTwo)
         std::filesystem::create_directory(folder / "tree");
         folder.write("tree/file", "content");
         ASSERT_EQ(pack(packer, folder).status, 0);
-        std::u16string const name = std::filesystem::exists(folder / "archive") ? u"archive" : u"archive.zip";
+        std::u16string const name = nameOfArchive(folder);
         StorageItem const root = openRoot(packer.format, localItem(folder.iri(name)));
         auto const packed = StorageItem(root, u"file").getFileAttributes().getLastModified();
         auto const local = localItem(folder.iri(u"tree/file")).getFileAttributes().getLastModified();

@@ -17,6 +17,14 @@ std::u16string schemeOf(ArchiveFormat format)
     switch (format) {
     case ArchiveFormat::Zip:
         return u"zip";
+    case ArchiveFormat::Tar:
+        return u"tar";
+    case ArchiveFormat::SevenZip:
+        return u"sevenzip";
+    case ArchiveFormat::Iso:
+        return u"iso";
+    case ArchiveFormat::Cpio:
+        return u"cpio";
     }
     return u"unknown";
 }

@@ -16,10 +16,15 @@ TEST(RegisterAll, AddsWhatIsBuiltIn)
 {
     Registry registry;
     registerAll(registry);
-    std::vector<Scheme> expected{{u"file", SchemeKind::Physical}, {u"mem", SchemeKind::Physical}};
+    std::vector<Scheme> const expected{
 #ifdef FOUNDATION_STORAGE_HAS_ARCHIVE
-    expected.push_back({u"zip", SchemeKind::Container});
+        {u"cpio", SchemeKind::Container}, {u"file", SchemeKind::Physical},      {u"iso", SchemeKind::Container},
+        {u"mem", SchemeKind::Physical},   {u"sevenzip", SchemeKind::Container}, {u"tar", SchemeKind::Container},
+        {u"zip", SchemeKind::Container},
+#else
+        {u"file", SchemeKind::Physical},  {u"mem", SchemeKind::Physical},
 #endif
+    };
     EXPECT_EQ(registry.schemes(), expected);
 }
 
