@@ -45,6 +45,9 @@ public:
     Process(Process const&) = delete;
     Process& operator=(Process const&) = delete;
 
+    /// Its number, while it runs.
+    pid_t id() const { return process_; }
+
     void send(int signal) const;
 
     /// Whether it has not ended yet.

@@ -1,12 +1,16 @@
 #include <storage/local/detail/ScratchFile.hpp>
 
+#include <storage/local/detail/copyContent.hpp>
 #include <storage/local/detail/errorCode.hpp>
+#include <storage/local/detail/metadata.hpp>
 #include <storage/local/detail/move.hpp>
 #include <storage/local/detail/nativePath.hpp>
 #include <storage/local/detail/scratchName.hpp>
 #include <storage/local/detail/sync.hpp>
 
 #include <cerrno>
+#include <unistd.h>
+#include <utility>
 
 namespace foundation::storage::local::detail {
 
@@ -18,6 +22,12 @@ namespace {
 
 constexpr unsigned permissionBits = 0777;
 
+/// Not every file system that makes files without names can name them, and the system may lack /proc.
+bool meansNeverNamed(int error)
+{
+    return error == ENOENT || error == EPERM || error == EOPNOTSUPP;
+}
+
 } // namespace
 
 ScratchFile::ScratchFile(Root const& root, StorageIRI const& target, Durability durability, int flags, mode_t mode,
@@ -27,12 +37,15 @@ ScratchFile::ScratchFile(Root const& root, StorageIRI const& target, Durability 
       scratch_(target),
       path_(root.pathOf(target)),
       name_(nameOf(path_)),
-      scratchName_(detail::scratchName()),
       durability_(durability),
       permissions_(permissions)
 {
     openFolders(path_);
-    int const error = openFile(scratchAt(), flags | O_CREAT | O_EXCL | O_NOFOLLOW, file_, modeForNew(mode));
+    std::optional<mode_t> const replaced = modeOfTarget();
+    if (!replaced && openNameless(flags, mode))
+        return;
+    scratchName_ = detail::scratchName();
+    int const error = openFile(scratchAt(), flags | O_CREAT | O_EXCL | O_NOFOLLOW, file_, replaced.value_or(mode));
     if (error != 0)
         throwError(error, scratch_);
 }
@@ -54,7 +67,7 @@ ScratchFile::ScratchFile(Root const& root, StorageIRI const& target, StorageIRI 
 
 ScratchFile::~ScratchFile()
 {
-    if (state_ == State::Writing)
+    if (state_ == State::Writing && !isNameless())
         removeName(scratchAt());
 }
 
@@ -82,12 +95,21 @@ void ScratchFile::openFolders(std::string const& scratchPath)
         throwError(error, scratch_);
 }
 
+/// Not where a name has to be replaced in the end, which takes a name. Readable, too, for `copyToNamed`. Where it
+/// fails, a file with a name does as well, or tells what is wrong.
+bool ScratchFile::openNameless(int flags, mode_t mode)
+{
+    if (durability_ != Durability::None)
+        return false;
+    return openFile({folder_.get(), "."}, (flags & ~O_ACCMODE) | O_RDWR | O_TMPFILE, file_, mode) == 0;
+}
+
 /// A new name is nobody's: not a link that somebody has put there, and not another writer's file.
 void ScratchFile::openScratch(int flags)
 {
     int error = EEXIST;
     if ((flags & O_CREAT) != 0)
-        error = openFile(scratchAt(), flags | O_EXCL | O_NOFOLLOW, file_, modeForNew(newFileMode));
+        error = openFile(scratchAt(), flags | O_EXCL | O_NOFOLLOW, file_, modeOfTarget().value_or(newFileMode));
     if (error == EEXIST)
         error = openExisting(flags & ~O_CREAT);
     if (error == EISDIR)
@@ -115,16 +137,17 @@ int ScratchFile::findTarget(Status& status) const
     return isUnreachable(error) ? ENOENT : error;
 }
 
-/// The content of a file that others may not read is not for them while it is being written either.
-mode_t ScratchFile::modeForNew(mode_t mode) const
+/// The content of a file that others may not read is not for them while it is being written either. Nothing where no
+/// file is replaced, or its permissions do not matter.
+std::optional<mode_t> ScratchFile::modeOfTarget() const
 {
     if (permissions_ == Permissions::Own)
-        return mode;
+        return std::nullopt;
     Status target;
     int const error = findTarget(target);
     if (error != 0 && !meansMissing(error))
         throwError(error, target_);
-    return error == 0 && S_ISREG(target.stx_mode) ? target.stx_mode & permissionBits : mode;
+    return error == 0 && S_ISREG(target.stx_mode) ? std::optional(target.stx_mode & permissionBits) : std::nullopt;
 }
 
 void ScratchFile::commit(ReplacementPolicy policy)
@@ -188,15 +211,72 @@ void ScratchFile::writeContentBack()
 
 void ScratchFile::putInPlace(ReplacementPolicy policy)
 {
-    int error =
-        replaces(policy) ? renameEntry(scratchAt(), targetAt(), 0) : moveFileWithoutReplacing(scratchAt(), targetAt());
+    int error = isNameless() ? nameInPlace(policy) : moveInPlace(policy);
     if (error == EISDIR)
         error = EEXIST;
     Status status;
-    if (error == ENOENT && meansMissing(getStatus(scratchAt(), Links::Keep, status)))
+    if (error == ENOENT && !isNameless() && meansMissing(getStatus(scratchAt(), Links::Keep, status)))
         throwError(error, scratch_);
     if (error != 0)
         throwError(error, target_);
+}
+
+int ScratchFile::moveInPlace(ReplacementPolicy policy)
+{
+    return replaces(policy) ? renameEntry(scratchAt(), targetAt(), 0)
+                            : moveFileWithoutReplacing(scratchAt(), targetAt());
+}
+
+/// A name is never given in place of another: what turned up meanwhile is replaced by way of a scratch name.
+int ScratchFile::nameInPlace(ReplacementPolicy policy)
+{
+    int error = nameFile(file_, targetAt());
+    bool const needsScratchName = error == EEXIST ? replaces(policy) : meansNeverNamed(error);
+    if (!needsScratchName)
+        return error;
+    error = giveScratchName();
+    return error != 0 ? error : moveInPlace(policy);
+}
+
+int ScratchFile::giveScratchName()
+{
+    scratchName_ = detail::scratchName();
+    int error = nameFile(file_, scratchAt());
+    if (meansNeverNamed(error))
+        error = copyToNamed();
+    if (error != 0)
+        scratchName_.clear();
+    return error;
+}
+
+int ScratchFile::copyToNamed()
+{
+    FileDescriptor named;
+    if (int const error = openFile(scratchAt(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, named, 0))
+        return error;
+    if (int const error = copyAll(named)) {
+        removeName(scratchAt());
+        return error;
+    }
+    file_ = std::move(named);
+    writeContentBack();
+    return 0;
+}
+
+int ScratchFile::copyAll(FileDescriptor const& to) const
+{
+    Status status;
+    if (int const error = getFullStatus(file_, status))
+        return error;
+    if (systemCalls().lseek(file_.get(), 0, SEEK_SET) == -1)
+        return errno;
+    if (int const error = copyContent(file_, status, to, {}).error)
+        return error;
+    if (int const error = keepUserAttributes(file_.get(), to.get()).error)
+        return error;
+    if (int const error = errorOf([&] { return systemCalls().fchmod(to.get(), status.stx_mode & permissionBits); }))
+        return error;
+    return keepTimes(to.get(), status);
 }
 
 int ScratchFile::syncFolder()
@@ -206,7 +286,7 @@ int ScratchFile::syncFolder()
 
 void ScratchFile::discard()
 {
-    if (state_ == State::Writing)
+    if (state_ == State::Writing && !isNameless())
         if (int const error = removeName(scratchAt()))
             throwError(error, scratch_);
     finish();

@@ -8,6 +8,7 @@
 #include <storage/provider/ReplacementPolicy.hpp>
 #include <storage/provider/StorageIRI.hpp>
 
+#include <optional>
 #include <string>
 
 namespace foundation::storage::local::detail {
@@ -25,12 +26,16 @@ enum class Permissions
 /// a link meanwhile changes nothing. Who replaces a file that others may not read need not fear that they read the
 /// scratch file: it never has permissions that the file lacks.
 ///
+/// One with a name of its own choice that replaces no file, and need not survive a power failure, has no name at all
+/// until the commit, where the file system can do that: it takes less time, and nothing is left of it when this process
+/// is killed.
+///
 /// Errors: `Exception`, and `DurabilityException` from `commit`.
 /// Ownership: refers to the root, which must outlive it. Removes the scratch file at the end of its life unless that
 /// took the target's place.
 /// Threads: one at a time.
-/// Cost: three descriptors at most; beside the writing eight calls for a commit that replaces a file under
-/// `Durability::Full`, two of which wait for the disk.
+/// Cost: three descriptors at most, for a moment one more; beside the writing eight calls for a commit that replaces a
+/// file under `Durability::Full`, two of which wait for the disk.
 class FOUNDATION_API ScratchFile
 {
 public:
@@ -75,10 +80,13 @@ private:
         Done
     };
 
+    bool isNameless() const { return scratchName_.empty(); }
+
     void openFolders(std::string const& scratchPath);
+    bool openNameless(int flags, mode_t mode);
     void openScratch(int flags);
     int openExisting(int flags);
-    mode_t modeForNew(mode_t mode) const;
+    std::optional<mode_t> modeOfTarget() const;
     int findTarget(Status& status) const;
 
     void keepPermissions();
@@ -86,6 +94,11 @@ private:
     int closeDuplicate();
     void writeContentBack();
     void putInPlace(provider::ReplacementPolicy policy);
+    int moveInPlace(provider::ReplacementPolicy policy);
+    int nameInPlace(provider::ReplacementPolicy policy);
+    int giveScratchName();
+    int copyToNamed();
+    int copyAll(FileDescriptor const& to) const;
     int syncFolder();
     void finish();
 
@@ -97,7 +110,7 @@ private:
     provider::StorageIRI const scratch_; ///< the location that failures name; the target where the name is our own
     std::string const path_;
     std::string const name_;
-    std::string scratchName_;
+    std::string scratchName_; ///< empty while it has none
     FileDescriptor folder_;
     FileDescriptor scratchFolder_; ///< open only where it is another one
     FileDescriptor file_;

@@ -123,6 +123,15 @@ int addName(At const& from, At const& to)
     return errorOf([&] { return systemCalls().linkat(from.folder, from.path, to.folder, to.path, 0); });
 }
 
+int nameFile(FileDescriptor const& file, At const& to)
+{
+    int const error = errorOf([&] { return systemCalls().linkat(file.get(), "", to.folder, to.path, AT_EMPTY_PATH); });
+    if (error != ENOENT)
+        return error;
+    std::string const self = pathOf(file);
+    return errorOf([&] { return systemCalls().linkat(AT_FDCWD, self.c_str(), to.folder, to.path, AT_SYMLINK_FOLLOW); });
+}
+
 int renameEntry(At const& from, At const& to, unsigned flags)
 {
     return errorOf([&] { return systemCalls().renameat2(from.folder, from.path, to.folder, to.path, flags); });

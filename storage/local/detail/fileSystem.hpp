@@ -69,6 +69,10 @@ int removeEmptyFolder(At const& at);
 /// Gives a file a second name; a link is not followed.
 [[nodiscard]] int addName(At const& from, At const& to);
 
+/// Gives a name to a file that was made with `O_TMPFILE`. `ENOENT` where this user has no right to do so by descriptor
+/// (`CAP_DAC_READ_SEARCH`), and /proc, which needs none, is not mounted.
+[[nodiscard]] int nameFile(FileDescriptor const& file, At const& to);
+
 /// `flags` as for `renameat2`.
 int renameEntry(At const& from, At const& to, unsigned flags);
 

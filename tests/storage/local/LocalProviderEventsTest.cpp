@@ -7,6 +7,9 @@
 #include <storage/provider/ChangeEventExceptions.hpp>
 #include <storage/provider/Exception.hpp>
 #include <tests/storage/local/WatchedFolder.hpp>
+#include <tests/storage/local/namelessFiles.hpp>
+
+#include <boost/property_tree/ptree.hpp>
 
 #include <array>
 #include <fcntl.h>
@@ -171,6 +174,19 @@ TEST_F(LocalProviderEventsConcurrency, OfACommitTellOfTheMoveOntoTheTarget)
     Texts const texts = told();
     ASSERT_EQ(texts.size(), 1U);
     EXPECT_TRUE(texts[0].starts_with("moved file ") && texts[0].ends_with(".tmp.bak to file")) << texts[0];
+}
+
+TEST_F(LocalProviderEventsConcurrency, OfACopyToANewNameTellThatItIsThere)
+{
+    if (!tests::support::hasNamelessFiles(folder.path()))
+        GTEST_SKIP() << "the file system has no files without names";
+    boost::property_tree::ptree settings;
+    settings.put("durability", "none");
+    provider->configure(settings);
+    folder.write("file", "content");
+    watchFolder(u"");
+    provider->copyFileAtomic(at(u"file"), at(u"copy"), ReplacementPolicy::Preserve, {});
+    EXPECT_EQ(told(), Texts{"created file copy"});
 }
 
 TEST_F(LocalProviderEventsConcurrency, OfManyWritesAreFewerThanTheWrites)

@@ -4,6 +4,7 @@
 
 #include <filesystem>
 #include <stdexcept>
+#include <string_view>
 #include <sys/stat.h>
 #include <unistd.h>
 #include <utility>
@@ -60,6 +61,12 @@ ino_t numberOf(int descriptor)
     return numberOf(descriptor, "");
 }
 
+/// Whether a call is given a file by its descriptor alone.
+bool isNameless(std::string_view path)
+{
+    return path.empty() || path.starts_with("/proc/self/fd/");
+}
+
 /// By a descriptor of its own: the one of the provider may not be readable.
 std::string contentOf(int descriptor)
 {
@@ -81,6 +88,10 @@ void recordContent(int descriptor)
 
 void recordOpened(int at, char const* path, int flags, bool existed, int descriptor)
 {
+    if ((flags & O_TMPFILE) == O_TMPFILE) {
+        recorder->add({.kind = Kind::CreateNameless, .file = numberOf(descriptor)});
+        return;
+    }
     Entry const entry(at, path);
     if (existed && (flags & O_TRUNC) != 0)
         recordContent(descriptor);
@@ -136,7 +147,6 @@ int recordRename(Kind kind, int from, char const* name, int to, char const* newN
 {
     Entry const entry(from, name);
     Entry const target(to, newName);
-    ino_t const file = numberOf(from, name);
     bool const isLink = kind == Kind::Link;
     recorder->count(isLink ? "linkat" : "renameat2");
     int const result = isLink ? realSystemCalls.linkat(from, name, to, newName, static_cast<int>(flags))
@@ -144,8 +154,8 @@ int recordRename(Kind kind, int from, char const* name, int to, char const* newN
     return after(result, [&] {
         recorder->add({.kind = kind,
                        .folder = entry.folder,
-                       .name = entry.name,
-                       .file = file,
+                       .name = isNameless(name) ? "" : entry.name,
+                       .file = numberOf(to, newName),
                        .toFolder = target.folder,
                        .toName = target.name});
     });
@@ -224,6 +234,8 @@ void replaceOthers(SystemCalls& calls)
 
 std::string shown(std::string const& name)
 {
+    if (name.empty())
+        return "nameless";
     return isScratchName(name) ? "scratch" : name;
 }
 
@@ -233,6 +245,7 @@ std::string describe(DiskEvent const& event)
 {
     switch (event.kind) {
     case Kind::Create:
+    case Kind::CreateNameless:
         return "create " + shown(event.name);
     case Kind::Write:
         return "write \"" + event.content + "\"";

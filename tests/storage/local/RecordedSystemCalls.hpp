@@ -15,9 +15,10 @@ struct DiskEvent
     enum class Kind
     {
         Create,
-        Write,  ///< to `content`, all that the file holds after it
-        Rename, ///< from `name` in `folder` to `toName` in `toFolder`
-        Link,   ///< the same, and the old name stays
+        CreateNameless, ///< a file that no name leads to
+        Write,          ///< to `content`, all that the file holds after it
+        Rename,         ///< from `name` in `folder` to `toName` in `toFolder`
+        Link,           ///< the same, and the old name stays
         Unlink,
         Sync,    ///< of a file or a folder
         SyncAll, ///< of the file system

@@ -4,6 +4,7 @@
 #include <csignal>
 #include <fcntl.h>
 #include <sys/ioctl.h>
+#include <sys/resource.h>
 #include <thread>
 #include <unistd.h>
 
@@ -46,27 +47,50 @@ protected:
         ::close(file);
     }
 
-    int countScratchFiles(std::string const& name) const
+    /// Those that the process has open in a folder. They need not have a name.
+    int countScratchFiles(Process const& process, std::string const& name) const
     {
+        namespace fs = std::filesystem;
+        std::string const inside = (fs::canonical(folder.path()) / name).native() + '/';
         int count = 0;
-        for (auto const& entry : std::filesystem::directory_iterator(folder / name))
-            count += entry.path().native().ends_with(".tmp.bak") ? 1 : 0;
+        std::error_code gone;
+        fs::directory_iterator file("/proc/" + std::to_string(process.id()) + "/fd", gone);
+        for (; !gone && file != fs::directory_iterator(); file.increment(gone)) {
+            std::error_code closed;
+            std::string const path = fs::read_symlink(file->path(), closed).native();
+            bool const isScratch = path.ends_with(".tmp.bak") || path.ends_with(" (deleted)");
+            count += path.starts_with(inside) && isScratch ? 1 : 0;
+        }
         return count;
+    }
+
+    /// Where nothing ends an endless copy, this does before it fills the disk.
+    void limitFiles() const
+    {
+        rlimit const limit{.rlim_cur = mostBytes, .rlim_max = mostBytes};
+        ::setrlimit(RLIMIT_FSIZE, &limit);
+        ::signal(SIGXFSZ, SIG_IGN);
     }
 
     /// Sends the signal while the tool makes so many copies in this folder, after it has made this entry.
     ProgramResult interrupt(Arguments const& arguments, int signal, std::string const& target = "t",
                             std::string const& entry = ".", int copies = 1) const
     {
-        Process process(command(arguments), inFolder());
+        ProcessOptions options = inFolder();
+        options.prepare = [this] { limitFiles(); };
+        Process process(command(arguments), options);
         auto const deadline = std::chrono::steady_clock::now() + 60s;
-        auto const isCopying = [&] { return exists(target + '/' + entry) && countScratchFiles(target) == copies; };
+        auto const isCopying = [&] {
+            return exists(target + '/' + entry) && countScratchFiles(process, target) == copies;
+        };
         while (!isCopying() && process.isRunning() && std::chrono::steady_clock::now() < deadline)
             std::this_thread::yield();
         EXPECT_TRUE(isCopying());
         process.send(signal);
         return process.finish();
     }
+
+    rlim_t mostBytes = rlim_t{1} << 30U;
 };
 
 TEST_F(Interrupt, LeavesNothingOfANewFile)
@@ -153,6 +177,7 @@ TEST_F(Interrupt, LeavesASourceThatIsMovedByCopying)
     if (!mount("other", "256m"))
         GTEST_SKIP() << "file systems may not be mounted here";
     makeScattered("big");
+    mostBytes = RLIM_INFINITY;
     ProgramResult const result = interrupt({"mv", "big", "other"}, SIGINT, "other");
     EXPECT_EQ(result.status, 130);
     EXPECT_EQ(result.errors, "storage: mv: interrupted: 0 of 1 moved; 0 files copied, 0 B\n");

@@ -4,15 +4,12 @@
 
 #include <storage/local/DurabilityException.hpp>
 #include <tests/storage/local/ReplacedSystemCalls.hpp>
-#include <tests/support/TemporaryFolder.hpp>
+#include <tests/storage/local/detail/ScratchFileFixture.hpp>
 #include <tests/support/failureOf.hpp>
 
 #include <filesystem>
-#include <memory>
-#include <string>
 #include <sys/stat.h>
 #include <unistd.h>
-#include <vector>
 
 namespace foundation::storage::local::detail {
 namespace {
@@ -23,44 +20,6 @@ using tests::support::failure;
 using tests::support::failureOf;
 using tests::support::failWith;
 using tests::support::ReplacedSystemCalls;
-using tests::support::TemporaryFolder;
-
-constexpr auto overwrite = ReplacementPolicy::Overwrite;
-constexpr auto preserve = ReplacementPolicy::Preserve;
-
-class ScratchFileTest : public testing::Test
-{
-protected:
-    StorageIRI at(std::u16string const& name) const { return folder.iri(name); }
-
-    /// A scratch file with content.
-    std::unique_ptr<ScratchFile> begin(std::u16string const& name, Durability durability = Durability::Full,
-                                       std::string const& content = "new") const
-    {
-        auto scratch = std::make_unique<ScratchFile>(root, at(name), durability);
-        EXPECT_EQ(::write(scratch->file().get(), content.data(), content.size()), static_cast<ssize_t>(content.size()));
-        return scratch;
-    }
-
-    std::vector<std::string> names(std::string const& below = "") const
-    {
-        std::vector<std::string> names;
-        for (fs::directory_entry const& entry : fs::directory_iterator(folder / below))
-            names.push_back(entry.path().filename());
-        std::sort(names.begin(), names.end());
-        return names;
-    }
-
-    unsigned modeOf(std::string const& name) const
-    {
-        return static_cast<unsigned>(fs::symlink_status(folder / name).permissions());
-    }
-
-    Root const root;
-    TemporaryFolder const folder;
-};
-
-using Names = std::vector<std::string>;
 
 TEST_F(ScratchFileTest, TakesTheTargetsPlaceWhole)
 {
@@ -206,12 +165,14 @@ TEST_F(ScratchFileTest, StaysInItsFolderWhenThatIsSwappedForALink)
     fs::create_directory(folder / "folder");
     fs::create_directory(folder / "elsewhere");
     auto committed = begin(u"folder/file");
+    auto nameless = begin(u"folder/unsynced", Durability::None);
     auto discarded = begin(u"folder/other");
     fs::rename(folder / "folder", folder / "moved");
     fs::create_directory_symlink("elsewhere", folder / "folder");
     committed->commit(overwrite);
+    nameless->commit(overwrite);
     discarded->discard();
-    EXPECT_EQ(names("moved"), Names{"file"});
+    EXPECT_EQ(names("moved"), (Names{"file", "unsynced"}));
     EXPECT_EQ(names("elsewhere"), Names{});
 }
 

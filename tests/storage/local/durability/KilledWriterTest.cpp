@@ -5,6 +5,7 @@
 #include <storage/local/detail/scratchName.hpp>
 #include <tests/storage/local/durability/SharedMemory.hpp>
 #include <tests/storage/local/durability/WrittenContent.hpp>
+#include <tests/storage/local/namelessFiles.hpp>
 #include <tests/support/TemporaryFolder.hpp>
 
 #include <boost/property_tree/ptree.hpp>
@@ -15,6 +16,7 @@
 #include <csignal>
 #include <cstdint>
 #include <filesystem>
+#include <functional>
 #include <random>
 #include <sched.h>
 #include <stdexcept>
@@ -45,12 +47,18 @@ struct Progress
     std::atomic<bool> hasBegun;
 };
 
+/// What a process leaves behind is not a matter of the disk.
+void neverSync(LocalProvider& provider)
+{
+    boost::property_tree::ptree settings;
+    settings.put("durability", "none");
+    provider.configure(settings);
+}
+
 [[noreturn]] void writeForEver(StorageIRI const& file, Progress& progress)
 {
     LocalProvider provider;
-    boost::property_tree::ptree settings;
-    settings.put("durability", "none"); // What a process leaves behind is not a matter of the disk.
-    provider.configure(settings);
+    neverSync(provider);
     progress.hasBegun = true;
     for (std::uint64_t number = progress.acknowledged.load() + 1;; ++number) {
         std::string const content = madeContent(number);
@@ -64,13 +72,27 @@ struct Progress
     }
 }
 
+/// Copies a file to new names, which are numbers.
+[[noreturn]] void copyForEver(StorageIRI const& file, StorageIRI const& folder, Progress& progress)
+{
+    LocalProvider provider;
+    neverSync(provider);
+    progress.hasBegun = true;
+    for (std::uint64_t number = progress.acknowledged.load() + 1;; ++number) {
+        std::string const name = std::to_string(number);
+        StorageIRI const copy(folder, std::u16string(name.begin(), name.end()));
+        provider.copyFileAtomic(file, copy, ReplacementPolicy::Preserve, {});
+        progress.acknowledged = number;
+    }
+}
+
 /// Lets a writer run for a moment from its first write on, however late the system starts it, and kills it.
-void killAWriter(StorageIRI const& file, Progress& progress, std::chrono::microseconds moment)
+void killAWriter(std::function<void()> const& writeForEver, Progress& progress, std::chrono::microseconds moment)
 {
     progress.hasBegun = false;
     pid_t const writer = ::fork();
     if (writer == 0)
-        writeForEver(file, progress);
+        writeForEver();
     if (writer == -1)
         throw std::runtime_error("no process for the writer");
     while (!progress.hasBegun && ::waitpid(writer, nullptr, WNOHANG) == 0)
@@ -92,7 +114,8 @@ TEST(KilledWriter, LeavesOldOrNewContentWholeAndNothingElseButScratchFiles)
     std::minstd_rand random(20240229);
     int interrupted = 0;
     for (int i = 0; i < kills; ++i) {
-        killAWriter(folder.iri(u"file"), *shared, std::chrono::microseconds(random() % 3000));
+        killAWriter([&] { writeForEver(folder.iri(u"file"), *shared); }, *shared,
+                    std::chrono::microseconds(random() % 3000));
         std::uint64_t const found = numberOfContent(folder.read("file"));
         ASSERT_TRUE(found == acknowledged.load() || found == acknowledged.load() + 1)
             << "found " << found << ", acknowledged " << acknowledged.load();
@@ -108,6 +131,37 @@ TEST(KilledWriter, LeavesOldOrNewContentWholeAndNothingElseButScratchFiles)
     }
     EXPECT_GT(acknowledged.load(), 0u) << "no writer got to the end of a write";
     EXPECT_GT(interrupted, kills / 20) << "the writers were not killed while they wrote";
+}
+
+TEST(KilledWriter, LeavesNothingOfACopyToANewName)
+{
+    TemporaryFolder const folder;
+    if (!tests::support::hasNamelessFiles(folder.path()))
+        GTEST_SKIP() << "the file system has no files without names";
+    std::string const content(std::size_t{1} << 20U, 'x');
+    folder.write("file", content);
+    fs::create_directory(folder / "copies");
+    SharedMemory<Progress> const shared;
+    std::minstd_rand random(20240229);
+    std::uint64_t before = 0;
+    int interrupted = 0;
+    for (int i = 0; i < kills / 5; ++i) {
+        killAWriter([&] { copyForEver(folder.iri(u"file"), folder.iri(u"copies"), *shared); }, *shared,
+                    std::chrono::microseconds(random() % 3000));
+        std::uint64_t const acknowledged = shared->acknowledged;
+        std::uint64_t found = before;
+        for (std::string name; fs::exists(folder / (name = "copies/" + std::to_string(found + 1))); ++found) {
+            ASSERT_TRUE(folder.read(name) == content) << name << " is torn";
+            fs::remove(folder / name);
+        }
+        ASSERT_TRUE(found == acknowledged || found == acknowledged + 1)
+            << "found " << found << ", acknowledged " << acknowledged;
+        ASSERT_TRUE(fs::is_empty(folder / "copies"));
+        interrupted += found == acknowledged ? 1 : 0;
+        shared->acknowledged = before = found;
+    }
+    EXPECT_GT(before, 0u) << "no writer got to the end of a copy";
+    EXPECT_GT(interrupted, 0) << "the writers were not killed while they copied";
 }
 
 } // namespace

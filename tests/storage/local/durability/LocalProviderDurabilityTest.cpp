@@ -4,6 +4,7 @@
 
 #include <storage/local/DurabilityException.hpp>
 #include <tests/storage/local/RecordedSystemCalls.hpp>
+#include <tests/storage/local/namelessFiles.hpp>
 #include <tests/support/TemporaryFolder.hpp>
 #include <tests/support/failureOf.hpp>
 
@@ -104,6 +105,17 @@ TEST_F(LocalProviderDurability, OfAnAtomicCopyIsThatOfACommit)
         told.erase(told.begin(), told.end() - static_cast<std::ptrdiff_t>(end.size()));
         EXPECT_EQ(told, end) << durability;
     }
+}
+
+TEST_F(LocalProviderDurability, NamesACopyOnceItIsWholeUnderNone)
+{
+    if (!tests::support::hasNamelessFiles(folder.path()))
+        GTEST_SKIP() << "the file system has no files without names";
+    folder.write("source", "new");
+    configure("none");
+    RecordedSystemCalls const record;
+    provider.copyFileAtomic(at(u"source"), at(u"copy"), ReplacementPolicy::Preserve, {});
+    EXPECT_EQ(record.told(), (Told{"create nameless", "write \"new\"", "link nameless to copy"}));
 }
 
 TEST_F(LocalProviderDurability, SyncsNothingThatIsAborted)

@@ -92,6 +92,7 @@ void PowerFailureModel::Disk::play(DiskEvent const& event, std::size_t number)
         while (!written.empty())
             sync(written.begin()->first);
         break;
+    case Kind::CreateNameless:
     case Kind::Note:
         break;
     }

@@ -4,6 +4,7 @@
 #include <array>
 #include <climits>
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <tuple>
 #include <type_traits>
 #include <unistd.h>
@@ -30,9 +31,16 @@ std::string linkTarget(std::string const& link)
     return size == -1 ? std::string() : std::string(target.data(), static_cast<std::size_t>(size));
 }
 
+/// A file that was made without a name is shown as deleted even when it has got one: then it is called named.
 std::string pathOf(int descriptor)
 {
-    return linkTarget("/proc/self/fd/" + std::to_string(descriptor));
+    std::string path = linkTarget("/proc/self/fd/" + std::to_string(descriptor));
+    constexpr std::string_view deleted = " (deleted)";
+    struct stat status
+    {};
+    if (path.ends_with(deleted) && ::fstat(descriptor, &status) == 0 && status.st_nlink > 0)
+        path.replace(path.size() - deleted.size(), deleted.size(), " (named)");
+    return path;
 }
 
 std::string pathOf(int folder, char const* path)

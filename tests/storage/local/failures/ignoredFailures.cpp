@@ -42,8 +42,12 @@ bool isNoShortage(int error)
 
 constexpr Case cases[] = {
     {anything, "fadvise", anything, any, Ignored::WithSameResult, "it is advice; nothing depends on it"},
-    {"commit.*|copy.*Atomic.*|move.*AcrossFileSystems", "close", "(to/(new|existing)|from/link)", any,
-     Ignored::WithSameResult, "the content is on the disk before it takes the place of the target"},
+    {"commit.*|copy.*Atomic.*|move.*AcrossFileSystems", "close", "(to/(new|existing|#[0-9]+ \\(named\\))|from/link)",
+     any, Ignored::WithSameResult, "the content is on the disk before it takes the place of the target"},
+    {"copy.*WithoutSync.*", "openat", "to/\\.", any, Ignored::WithSameResult,
+     "where no file can be made without a name, one with a name does as well"},
+    {"copy.*WithoutNewNames", "close", "to/#[0-9]+ \\(deleted\\)", any, Ignored::WithSameResult,
+     "a file that is copied to one with a name is not wanted any more"},
     {anything, "ficlone|copy_file_range", anything, any, Ignored::WithSameResult,
      "the content is read and written instead, which tells the end that fails"},
     {"copySparseFileAtomic", "lseek", "from/sparse", any, Ignored::WithSameResult,

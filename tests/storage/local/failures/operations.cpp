@@ -5,6 +5,7 @@
 #include <boost/property_tree/ptree.hpp>
 
 #include <array>
+#include <memory>
 #include <set>
 #include <sstream>
 #include <utility>
@@ -151,13 +152,34 @@ void writeTransaction(Scene const& scene, std::u16string const& name, StreamClos
     writeTransaction(scene.provider(), scene.at(name), policy);
 }
 
-void writeWithoutSync(Scene const& scene, std::u16string const& name)
+std::unique_ptr<IProvider> providerWithoutSync()
 {
-    storage::local::LocalProvider provider;
+    auto provider = std::make_unique<storage::local::LocalProvider>();
     boost::property_tree::ptree settings;
     settings.put("durability", "none");
-    provider.configure(settings);
-    writeTransaction(provider, scene.at(name), StreamClosePolicy::Commit);
+    provider->configure(settings);
+    return provider;
+}
+
+void writeWithoutSync(Scene const& scene, std::u16string const& name)
+{
+    writeTransaction(*providerWithoutSync(), scene.at(name), StreamClosePolicy::Commit);
+}
+
+Operation copyWithoutSync(std::string name, std::u16string const& from, std::u16string const& to,
+                          ReplacementPolicy policy)
+{
+    return transfer(std::move(name), from, to,
+                    [=](Scene const& s) { providerWithoutSync()->copyFileAtomic(s.at(from), s.at(to), policy, {}); });
+}
+
+/// Where files that were made without names stay without.
+Operation lackingNewNames(Operation operation)
+{
+    operation.name += "WithoutNewNames";
+    operation.lacking = EPERM;
+    operation.lacks = [](SystemCall const& call) { return call.name == "linkat"; };
+    return operation;
 }
 
 ByteStreamOpenOptions appending()
@@ -246,6 +268,10 @@ std::vector<Operation> transferOperations()
         copyAtomically("copyFileAtomicReplacingLink", u"from/long", u"from/link", Overwrite),
         lackingKernelCopies(copyAtomically("copyFileAtomic", u"from/long", u"to/new", Preserve)),
         copyAtomically("copySparseFileAtomic", u"from/sparse", u"to/new", Preserve),
+        copyWithoutSync("copyFileAtomicWithoutSync", u"from/long", u"to/new", Preserve),
+        copyWithoutSync("copySmallFileAtomicWithoutSync", u"from/file", u"to/new", Overwrite),
+        copyWithoutSync("copyFileAtomicReplacingWithoutSync", u"from/long", u"to/existing", Overwrite),
+        lackingNewNames(copyWithoutSync("copyFileAtomicWithoutSync", u"from/long", u"to/new", Preserve)),
         copyAtomically("copyFileAtomicOntoItself", u"from/file", u"from/second name", Overwrite),
         copy("copyFileOntoItself", u"from/file", u"from/second name", Overwrite),
     };
