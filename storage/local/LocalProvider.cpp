@@ -2,21 +2,19 @@
 
 #include <storage/local/detail/ChangeNotifier.hpp>
 #include <storage/local/detail/LocalByteStream.hpp>
-#include <storage/local/detail/LocalListing.hpp>
 #include <storage/local/detail/LocalTransaction.hpp>
-#include <storage/local/detail/RecursiveListing.hpp>
 #include <storage/local/detail/Root.hpp>
 #include <storage/local/detail/Settings.hpp>
 #include <storage/local/detail/TreeRemoval.hpp>
 #include <storage/local/detail/attributes.hpp>
 #include <storage/local/detail/changeAttributes.hpp>
 #include <storage/local/detail/copyFile.hpp>
+#include <storage/local/detail/durableMove.hpp>
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/extendedAttributes.hpp>
 #include <storage/local/detail/fileSystem.hpp>
 #include <storage/local/detail/move.hpp>
 #include <storage/local/detail/nativePath.hpp>
-#include <storage/local/detail/scratchName.hpp>
 #include <storage/local/detail/sync.hpp>
 #include <storage/provider/ChangeEventExceptions.hpp>
 
@@ -28,7 +26,6 @@ namespace foundation::storage::local {
 
 using namespace provider;
 using namespace detail;
-using fl::filesystem::Wildcards;
 
 namespace {
 
@@ -66,37 +63,6 @@ Located locate(Root const& root, std::string const& path, StorageIRI const& iri)
     if (int const error = root.locate(path, entry))
         throwError(error, iri);
     return entry;
-}
-
-/// Nothing is to be synced of what is missing, a link or a socket; the move tells whether that matters.
-int syncContent(Root const& root, std::string const& path)
-{
-    constexpr int flags = O_NOFOLLOW | O_NOCTTY | O_NONBLOCK;
-    FileDescriptor file;
-    int error = root.open(path, O_RDONLY | flags, file);
-    if (error == EACCES)
-        error = root.open(path, O_WRONLY | flags, file);
-    if (error == 0)
-        return sync(file, file);
-    return meansMissing(error) || error == ELOOP || error == ENXIO ? 0 : error;
-}
-
-/// Who writes to a scratch file and moves it to its place relies on it as on a transaction.
-void syncScratchFile(Settings const& settings, StorageIRI const& from)
-{
-    std::string const path = settings.root.pathOf(from);
-    if (settings.durability == Durability::None || !isScratchName(nameOf(path)))
-        return;
-    if (int const error = syncContent(settings.root, path))
-        throwError(error, from);
-}
-
-void makeMoveDurable(Settings const& settings, StorageIRI const& from, StorageIRI const& to)
-{
-    if (settings.durability != Durability::Full)
-        return;
-    if (int const error = syncFoldersOf(settings.root, settings.root.pathOf(from), settings.root.pathOf(to)))
-        throwNotDurable(error, to);
 }
 
 } // namespace
@@ -213,17 +179,12 @@ void LocalProvider::doRemoveFolderRecursively(StorageIRI const& iri) const
 
 void LocalProvider::doMoveFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
-    auto const settings = this->settings();
-    syncScratchFile(*settings, from);
-    detail::moveFile(settings->root, from, to, policy);
-    makeMoveDurable(*settings, from, to);
+    moveFileDurably(*settings(), from, to, policy);
 }
 
 void LocalProvider::doMoveFolder(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
 {
-    auto const settings = this->settings();
-    detail::moveFolder(settings->root, from, to, policy);
-    makeMoveDurable(*settings, from, to);
+    moveFolderDurably(*settings(), from, to, policy);
 }
 
 void LocalProvider::doCopyFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
@@ -283,103 +244,11 @@ std::unique_ptr<ByteStream> LocalProvider::doOpenReadOnlyStream(StorageIRI const
     return openForReading(*root(), iri);
 }
 
-IProvider::Listing LocalProvider::list(StorageIRI const& folder, Selection selection) const
-{
-    return std::make_unique<LocalListing>(root(), folder, std::move(selection));
-}
-
 std::unique_ptr<TransactionalStream>
 LocalProvider::doOpenTransactionalStreamAtScratchLocation(StorageIRI const& target, StorageIRI const& scratch,
                                                           ByteStreamOpenOptions const& options) const
 {
     return std::make_unique<LocalTransaction>(settings(), target, scratch, options);
-}
-
-IProvider::Listing LocalProvider::doListAll(StorageIRI const& folder) const
-{
-    return list(folder, {});
-}
-
-IProvider::Listing LocalProvider::doListAllWildcards(StorageIRI const& folder, std::u16string pattern) const
-{
-    return list(folder, {.pattern = Wildcards(pattern)});
-}
-
-IProvider::Listing LocalProvider::doListFiles(StorageIRI const& folder) const
-{
-    return list(folder, {.entries = Entries::Files});
-}
-
-IProvider::Listing LocalProvider::doListFilesWildcards(StorageIRI const& folder, std::u16string pattern) const
-{
-    return list(folder, {.entries = Entries::Files, .pattern = Wildcards(pattern)});
-}
-
-IProvider::Listing LocalProvider::doListFolders(StorageIRI const& folder) const
-{
-    return list(folder, {.entries = Entries::Folders});
-}
-
-IProvider::Listing LocalProvider::doListFoldersWildcards(StorageIRI const& folder, std::u16string pattern) const
-{
-    return list(folder, {.entries = Entries::Folders, .pattern = Wildcards(pattern)});
-}
-
-IProvider::Listing LocalProvider::doListAllNamesOnly(StorageIRI const& folder) const
-{
-    return list(folder, {.detail = Detail::NamesOnly});
-}
-
-IProvider::Listing LocalProvider::doListAllNamesOnlyWildcards(StorageIRI const& folder, std::u16string pattern) const
-{
-    return list(folder, {.detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
-}
-
-IProvider::Listing LocalProvider::doListFoldersNamesOnly(StorageIRI const& folder) const
-{
-    return list(folder, {.entries = Entries::Folders, .detail = Detail::NamesOnly});
-}
-
-IProvider::Listing LocalProvider::doListFoldersNamesOnlyWildcards(StorageIRI const& folder,
-                                                                  std::u16string pattern) const
-{
-    return list(folder, {.entries = Entries::Folders, .detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
-}
-
-IProvider::Listing LocalProvider::doListFilesNamesOnly(StorageIRI const& folder) const
-{
-    return list(folder, {.entries = Entries::Files, .detail = Detail::NamesOnly});
-}
-
-IProvider::Listing LocalProvider::doListFilesNamesOnlyWildcards(StorageIRI const& folder, std::u16string pattern) const
-{
-    return list(folder, {.entries = Entries::Files, .detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
-}
-
-IProvider::Listing LocalProvider::listRecursively(StorageIRI const& folder, Selection selection) const
-{
-    return std::make_unique<RecursiveListing>(root(), folder, std::move(selection));
-}
-
-IProvider::Listing LocalProvider::doListAllRecursive(StorageIRI const& folder) const
-{
-    return listRecursively(folder, {});
-}
-
-IProvider::Listing LocalProvider::doListAllRecursiveWildcards(StorageIRI const& folder, std::u16string pattern) const
-{
-    return listRecursively(folder, {.pattern = Wildcards(pattern)});
-}
-
-IProvider::Listing LocalProvider::doListAllRecursiveNamesOnly(StorageIRI const& folder) const
-{
-    return listRecursively(folder, {.detail = Detail::NamesOnly});
-}
-
-IProvider::Listing LocalProvider::doListAllRecursiveNamesOnlyWildcards(StorageIRI const& folder,
-                                                                       std::u16string pattern) const
-{
-    return listRecursively(folder, {.detail = Detail::NamesOnly, .pattern = Wildcards(pattern)});
 }
 
 void LocalProvider::doPublishFolderEventsFor(StorageIRI const& folder, ChangeEventCallback const& callback,

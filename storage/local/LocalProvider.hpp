@@ -25,12 +25,11 @@ struct Settings;
 /// extended attributes and what is refused: see the README beside this header.
 ///
 /// Errors: `Exception`; for streams in use `ByteStreamFailure`. `InvalidLocation` where a location names no local file.
-/// Settings: `durability`, `preserve` and `root`; see the README. `configure` throws `std::invalid_argument` for what it does not
-/// understand, and changes nothing then. What is open keeps the settings that it was opened with.
-/// Threads: any number at once, with `configure` too. A stream or listing belongs to one thread at a time.
-/// Change events come in a thread of the provider; see the README for what callbacks may do.
-/// Cost: holds nothing but what its streams and listings hold, a descriptor each; with subscriptions to change events a
-/// thread and two descriptors.
+/// Settings: `durability`, `preserve` and `root`; see the README. `configure` throws `std::invalid_argument` for what
+/// it does not understand, and changes nothing then. What is open keeps the settings that it was opened with. Threads:
+/// any number at once, with `configure` too. A stream or listing belongs to one thread at a time. Change events come in
+/// a thread of the provider; see the README for what callbacks may do. Cost: holds nothing but what its streams and
+/// listings hold, a descriptor each; with subscriptions to change events a thread and two descriptors.
 class FOUNDATION_API LocalProvider : public provider::IConfigurableProvider
 {
 public:

@@ -76,9 +76,11 @@ public:
     /// GiB", with the number of all files if `isAll` were asked for.
     std::string stop(bool isAll);
 
-private:
+    /// To be called again and again by who does long work beside the copies: tells how far all is. Throws
+    /// `Interrupted`.
     void lookAround();
 
+private:
     /// In a thread of its own.
     OrderedWorkers::Report copy(Place const& source, Place const& target, TargetState state, WorkerContext& context);
     OrderedWorkers::Report reportOf(Failure failure, Transfer const& transfer);

@@ -7,15 +7,17 @@
 #include <tools/storage/commands.hpp>
 #include <tools/storage/copyOptions.hpp>
 #include <tools/storage/describe.hpp>
+#include <tools/storage/explain.hpp>
 #include <tools/storage/interrupt.hpp>
+#include <tools/storage/physicalPath.hpp>
 #include <tools/storage/transfers.hpp>
 
-#include <boost/any.hpp>
 #include <boost/date_time/posix_time/posix_time_types.hpp>
 #include <cstdint>
 #include <fmt/format.h>
 #include <memory>
 #include <optional>
+#include <storage/local/interruptibleMoves.hpp>
 #include <storage/provider/Exception.hpp>
 
 namespace foundation::storage::tool {
@@ -24,6 +26,7 @@ namespace {
 
 using boost::posix_time::microsec_clock;
 using boost::posix_time::ptime;
+using provider::ReplacementPolicy;
 
 struct Options
 {
@@ -42,14 +45,22 @@ public:
 private:
     void moveArgument(std::string const& argument);
     void move(Place const& source);
+    void moveLocal(Place const& source, Kind kind, Place const& target);
     bool moveWithinStore(Place const& source, Kind kind, Place const& target) const;
     bool moveByCopying(Place const& source, Kind kind, Place const& target);
     bool moveFileByCopying(Place const& source, Place const& target);
     void moveFolderByCopying(Place const& source, Place const& target);
     void tell(Place const& source, Place const& target);
 
+    ReplacementPolicy policy() const
+    {
+        return replace_ == Replace::Files ? ReplacementPolicy::Overwrite : ReplacementPolicy::NoClobber;
+    }
+
     Session& session_;
     Replace replace_;
+    bool isSynced_;
+    bool copies_ = false; ///< has copied what no store could move
     CopyRun run_;
     TreeCopier trees_;
     TargetOperand target_;
@@ -90,27 +101,25 @@ void requireLasting(Place const& target)
         throw Failure{target.text(), "goes when the command ends, so that nothing is moved there"};
 }
 
-/// The device that holds a file or folder; nothing where the store does not tell.
-std::optional<std::uint64_t> deviceOf(provider::StorageItem const& item)
+/// What an end of a move fails with may lie in the folder that is moved.
+Place placeOf(provider::StorageIRI const& location, Place const& source, Place const& target)
 {
-    try {
-        auto const attributes = item.getExtendedAttributes();
-        if (attributes.hasAttribute("device"))
-            return boost::any_cast<std::uint64_t>(attributes.getAttribute("device"));
-    } catch (provider::Exception const&) {
-        // The move itself tells what is wrong.
-    }
-    return std::nullopt;
+    provider::StorageIRI const from = source.item().getLocation();
+    if (location == target.item().getLocation())
+        return target;
+    if (!from.isAncestorOf(location))
+        return source;
+    return source.child(location.getPath().substr(from.getPath().size() + 1));
 }
 
-/// What a store then moves by copying is better copied here: that can be interrupted, and tells how far it is.
-bool isBetweenFileSystems(Place const& source, Kind kind, Place const& target)
+/// A folder appears at its target when all of it is there; after that nothing fails but the removal of the source.
+Failure failureOf(provider::Exception const& error, Place const& source, Kind kind, Place const& target)
 {
-    if ((kind != Kind::RegularFile && kind != Kind::RegularFolder) || !target.item().hasParent())
-        return false;
-    std::optional<std::uint64_t> const from = deviceOf(source.item());
-    std::optional<std::uint64_t> const to = from ? deviceOf(target.item().getParent()) : std::nullopt;
-    return from && to && *from != *to;
+    Place const place = placeOf(error.getStorageIRI(), source, target);
+    std::string const reason = explain(error);
+    bool const stays =
+        kind == Kind::RegularFolder && place.text() != target.text() && kindOf(target) == Kind::RegularFolder;
+    return {place.text(), stays ? reason + "; all that was moved is in " + target.text() : reason};
 }
 
 CopyRunOptions runOptions(Options const& options, Replace replace)
@@ -127,6 +136,7 @@ CopyRunOptions runOptions(Options const& options, Replace replace)
 Move::Move(Session& session, Options const& options, Place target)
     : session_(session),
       replace_(options.replaces ? Replace::Files : Replace::Never),
+      isSynced_(options.transfers.isSynced),
       run_(session, runOptions(options, replace_)),
       trees_(run_),
       target_(std::move(target), options.paths.size() - 1),
@@ -143,7 +153,8 @@ void Move::moveAll(std::vector<std::string> const& sources)
             moveArgument(source);
     } catch (Interrupted const& interrupted) {
         std::string const copied = run_.stop(false);
-        throw Interrupted{interrupted.signal, fmt::format("{} of {} moved; {}", moved_, sources.size(), copied)};
+        throw Interrupted{interrupted.signal,
+                          fmt::format("{} of {} moved{}", moved_, sources.size(), copies_ ? "; " + copied : "")};
     }
 }
 
@@ -169,7 +180,9 @@ void Move::move(Place const& source)
         requireFolderTarget(target);
     else
         requireFileTarget(target, replace_);
-    if (!moveWithinStore(source, kind, target) && !moveByCopying(source, kind, target))
+    if (isLocal(source) && isLocal(target))
+        moveLocal(source, kind, target);
+    else if (!moveWithinStore(source, kind, target) && !moveByCopying(source, kind, target))
         return;
     ++moved_;
     tell(source, target);
@@ -186,16 +199,14 @@ void Move::tell(Place const& source, Place const& target)
 /// Answers whether the store can do it. What it refuses is told at the end of the move that it names.
 bool Move::moveWithinStore(Place const& source, Kind kind, Place const& target) const
 {
-    using provider::ReplacementPolicy;
-    if (!source.item().hasSameProviderInstance(target.item()) || isBetweenFileSystems(source, kind, target))
+    if (!source.item().hasSameProviderInstance(target.item()))
         return false;
     provider::StorageIRI const to = target.item().getLocation();
     try {
         if (kind == Kind::RegularFolder)
             source.item().moveFolder(to, ReplacementPolicy::NoClobber);
         else
-            source.item().moveFile(to, replace_ == Replace::Files ? ReplacementPolicy::Overwrite
-                                                                  : ReplacementPolicy::NoClobber);
+            source.item().moveFile(to, policy());
     } catch (provider::Exception const& error) {
         if (error.getErrorCode() == provider::ErrorCode::UnsupportedOperation)
             return false;
@@ -204,9 +215,32 @@ bool Move::moveWithinStore(Place const& source, Kind kind, Place const& target) 
     return true;
 }
 
+/// From one file system to another the store copies, which can be interrupted and tells how far it is.
+void Move::moveLocal(Place const& source, Kind kind, Place const& target)
+{
+    local::MoveOptions options{.policy = policy(), .isSynced = isSynced_};
+    options.observer.interrupt = [this] {
+        run_.lookAround();
+        return provider::InterruptSignal::Continue;
+    };
+    options.observer.onBytes = [this](std::uint64_t count) { session_.progress().addBytes(static_cast<long>(count)); };
+    options.observer.onFile = [this] { session_.progress().addFile(); };
+    provider::StorageIRI const from = source.item().getLocation();
+    provider::StorageIRI const to = target.item().getLocation();
+    try {
+        if (kind == Kind::RegularFolder)
+            local::moveFolderInterruptibly(from, to, options);
+        else
+            local::moveFileInterruptibly(from, to, options);
+    } catch (provider::Exception const& error) {
+        throw failureOf(error, source, kind, target);
+    }
+}
+
 /// Answers whether it was moved; if not, that has been complained about.
 bool Move::moveByCopying(Place const& source, Kind kind, Place const& target)
 {
+    copies_ = true;
     // The source goes: its copy must not be lost with the power.
     session_.stores().syncAll();
     session_.stores().keepMetadata();

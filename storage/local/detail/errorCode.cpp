@@ -1,6 +1,7 @@
 #include <storage/local/detail/errorCode.hpp>
 
 #include <storage/provider/Exception.hpp>
+#include <storage/provider/ReasonInfo.hpp>
 
 #include <cerrno>
 
@@ -73,6 +74,13 @@ void throwError(int error, provider::StorageIRI const& iri)
 void throwError(ErrorCode code, provider::StorageIRI const& iri)
 {
     throw provider::Exception(code, iri);
+}
+
+void throwError(int error, provider::StorageIRI const& iri, char16_t const* reason)
+{
+    provider::Exception failure(toErrorCode(error), iri);
+    failure << provider::ReasonInfo(reason);
+    throw failure;
 }
 
 bool meansMissing(int error)

@@ -14,6 +14,9 @@ FOUNDATION_API provider::ErrorCode toErrorCode(int error);
 
 [[noreturn]] void throwError(provider::ErrorCode code, provider::StorageIRI const& iri);
 
+/// The same, with words for what the code does not tell; see `ReasonInfo`.
+[[noreturn]] void throwError(int error, provider::StorageIRI const& iri, char16_t const* reason);
+
 /// Whether an `errno` says that nothing is there to which the path leads, be it for a missing name, a file in the place
 /// of a folder, links that loop, or a name longer than any name can be.
 bool meansMissing(int error);

@@ -202,7 +202,8 @@ int moveFolderWithoutReplacing(At const& from, At const& to)
     return lacksNoReplace(error) ? moveFolderOntoNewFolder(from, to) : error;
 }
 
-void moveFile(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
+void moveFile(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy,
+              MoveWatch const& watch)
 {
     Move const move(root, from, to);
     Status const source = requireSource(move);
@@ -211,12 +212,13 @@ void moveFile(Root const& root, StorageIRI const& from, StorageIRI const& to, Re
     int const error = replaces(policy) ? moveFileReplacing(move, source)
                                        : moveFileWithoutReplacing(move.source.at(), move.target.at());
     if (error == EXDEV)
-        moveFileAcross(root, from, to, policy);
+        moveFileAcross(root, from, to, policy, watch);
     else
         requireMoved(error, move);
 }
 
-void moveFolder(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
+void moveFolder(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy,
+                MoveWatch const& watch)
 {
     Move const move(root, from, to);
     Status const source = requireSource(move);
@@ -229,7 +231,7 @@ void moveFolder(Root const& root, StorageIRI const& from, StorageIRI const& to, 
     if (error == EEXIST && replaces(policy) && isOntoItself(move, source))
         return;
     if (error == EXDEV)
-        moveFolderAcross(root, from, to);
+        moveFolderAcross(root, from, to, watch);
     else
         requireMoved(error, move);
 }

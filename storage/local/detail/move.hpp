@@ -1,5 +1,6 @@
 #pragma once
 
+#include <storage/local/detail/MoveWatch.hpp>
 #include <storage/local/detail/Root.hpp>
 #include <storage/local/detail/fileSystem.hpp>
 #include <storage/provider/ReplacementPolicy.hpp>
@@ -19,9 +20,9 @@ bool replaces(provider::ReplacementPolicy policy);
 // From one file system to another they copy, see `moveAcross.hpp`.
 
 void moveFile(Root const& root, provider::StorageIRI const& from, provider::StorageIRI const& to,
-              provider::ReplacementPolicy policy);
+              provider::ReplacementPolicy policy, MoveWatch const& watch);
 void moveFolder(Root const& root, provider::StorageIRI const& from, provider::StorageIRI const& to,
-                provider::ReplacementPolicy policy);
+                provider::ReplacementPolicy policy, MoveWatch const& watch);
 
 /// Throws what is wrong with a location where a folder itself, not a link to one, had to stand.
 [[noreturn]] void throwNotAFolder(Root const& root, std::string const& path, provider::StorageIRI const& iri);

@@ -2,7 +2,6 @@
 
 #include <storage/local/detail/ScratchFile.hpp>
 #include <storage/local/detail/checkedRemoval.hpp>
-#include <storage/local/detail/copyFailure.hpp>
 #include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/move.hpp>
 #include <storage/local/detail/moveContent.hpp>
@@ -53,7 +52,7 @@ public:
         if (error == 0 && !S_ISREG(status_.stx_mode))
             error = EBUSY;
         if (error != 0)
-            throwError(error, iri_);
+            throwAtSource(error, iri_);
     }
 
     void requireUnchanged() const
@@ -61,7 +60,7 @@ public:
         Status now;
         int const error = getFullStatus(at(), Links::Keep, now);
         if (error != 0 || !isUnchanged(status_, now))
-            throwError(error != 0 && !meansMissing(error) ? error : EBUSY, iri_);
+            throwAtSource(error != 0 && !meansMissing(error) ? error : EBUSY, iri_);
     }
 
     void remove() const
@@ -122,12 +121,13 @@ void requireReplaceable(Root const& root, Status const& source, StorageIRI const
         throwError(EXDEV, to);
 }
 
-void copyRegularFile(Root const& root, Source& source, StorageIRI const& to, ReplacementPolicy policy)
+void copyRegularFile(Root const& root, Source& source, StorageIRI const& to, ReplacementPolicy policy,
+                     MoveWatch const& watch)
 {
     FileDescriptor file;
     source.open(file);
     ScratchFile scratch(root, to, Durability::Full, O_RDWR, privateMode, Permissions::Own);
-    requireCopied(moveContent(file, source.status(), scratch.file()), source.iri(), to);
+    requireMoved(moveContent(file, source.status(), scratch.file(), watch), source.iri(), to);
     source.requireUnchanged();
     scratch.commit(policy);
 }
@@ -140,7 +140,7 @@ void copyLink(Root const& root, Source const& source, StorageIRI const& to, Repl
     if (int const error = root.openParent(path, folder, name))
         throwError(error, to);
     ScratchLink scratch(folder);
-    requireCopied(moveLink(source.at(), source.status(), scratch.at()), source.iri(), to);
+    requireMoved(moveLink(source.at(), source.status(), scratch.at()), source.iri(), to);
     if (int const error = scratch.putInPlace({folder.get(), name.c_str()}, policy))
         throwError(error, to);
     if (int const error = syncFolderOf(root, path))
@@ -149,17 +149,18 @@ void copyLink(Root const& root, Source const& source, StorageIRI const& to, Repl
 
 } // namespace
 
-void moveFileAcross(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
+void moveFileAcross(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy,
+                    MoveWatch const& watch)
 {
     Source source(root, from);
     bool const isLink = detail::isLink(source.status());
     if (!isLink && !S_ISREG(source.status().stx_mode))
-        throwError(ErrorCode::UnsupportedOperation, from);
+        throwAtSource(EOPNOTSUPP, from);
     requireReplaceable(root, source.status(), to, policy);
     if (isLink)
         copyLink(root, source, to, policy);
     else
-        copyRegularFile(root, source, to, policy);
+        copyRegularFile(root, source, to, policy, watch);
     source.remove();
 }
 

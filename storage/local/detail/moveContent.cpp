@@ -1,6 +1,8 @@
 #include <storage/local/detail/moveContent.hpp>
 
 #include <storage/local/detail/SystemCalls.hpp>
+#include <storage/local/detail/copyFailure.hpp>
+#include <storage/local/detail/errorCode.hpp>
 #include <storage/local/detail/metadata.hpp>
 #include <storage/local/detail/sync.hpp>
 
@@ -12,6 +14,7 @@
 #include <memory>
 #include <span>
 #include <unistd.h>
+#include <utility>
 
 namespace foundation::storage::local::detail {
 
@@ -60,9 +63,47 @@ int rewind(FileDescriptor const& file)
     return systemCalls().lseek(file.get(), 0, SEEK_SET) == -1 ? errno : 0;
 }
 
-/// What the disk holds is to be compared, not what was kept in memory while it was written.
-CopyResult readBack(FileDescriptor const& source, std::uint64_t size, FileDescriptor const& target)
+/// A part of a file that is told of as it is done.
+class Share
 {
+public:
+    Share(MoveWatch const& watch, std::uint64_t size) : watch_(watch), rest_(size) {}
+
+    void add(std::uint64_t count)
+    {
+        count = std::min(count, rest_);
+        rest_ -= count;
+        watch_.tellBytes(count);
+    }
+
+    void addRest() { add(rest_); }
+
+private:
+    MoveWatch const& watch_;
+    std::uint64_t rest_;
+};
+
+CopyResult copyWatched(FileDescriptor const& file, Status const& source, FileDescriptor const& target,
+                       MoveWatch const& watch)
+{
+    Share share(watch, source.stx_size / 2);
+    bool hasBegun = false;
+    CopyResult const result = copyContent(file, source, target, [&] {
+        watch.check();
+        if (std::exchange(hasBegun, true))
+            share.add(bufferSize / 2);
+        return provider::InterruptSignal::Continue;
+    });
+    if (!hasFailed(result))
+        share.addRest();
+    return result;
+}
+
+/// What the disk holds is to be compared, not what was kept in memory while it was written.
+CopyResult readBack(FileDescriptor const& source, std::uint64_t size, FileDescriptor const& target,
+                    MoveWatch const& watch)
+{
+    Share share(watch, size - size / 2);
     static_cast<void>(systemCalls().fadvise(target.get(), 0, 0, POSIX_FADV_DONTNEED));
     if (int const error = rewind(source))
         return atSource(error);
@@ -74,6 +115,7 @@ CopyResult readBack(FileDescriptor const& source, std::uint64_t size, FileDescri
     std::span<char> const found(buffers.get() + half, half);
     std::uint64_t total = 0;
     for (std::size_t expectedSize = half; expectedSize == half;) {
+        watch.check();
         std::size_t foundSize = 0;
         if (int const error = readFully(source, expected, expectedSize))
             return atSource(error);
@@ -82,13 +124,16 @@ CopyResult readBack(FileDescriptor const& source, std::uint64_t size, FileDescri
         if (foundSize != expectedSize || std::memcmp(expected.data(), found.data(), foundSize) != 0)
             return atTarget(EIO);
         total += foundSize;
+        share.add(foundSize / 2);
     }
+    share.addRest();
     return total == size ? CopyResult() : atSource(EBUSY);
 }
 
-CopyResult copyAll(FileDescriptor const& file, Status const& source, FileDescriptor const& target)
+CopyResult copyAll(FileDescriptor const& file, Status const& source, FileDescriptor const& target,
+                   MoveWatch const& watch)
 {
-    CopyResult result = copyContent(file, source, target, {});
+    CopyResult result = copyWatched(file, source, target, watch);
     if (!hasFailed(result))
         result = atTarget(keepOwnerAndMode(target.get(), source));
     if (!hasFailed(result))
@@ -96,7 +141,7 @@ CopyResult copyAll(FileDescriptor const& file, Status const& source, FileDescrip
     if (!hasFailed(result))
         result = atTarget(sync(target, target));
     if (!hasFailed(result))
-        result = readBack(file, source.stx_size, target);
+        result = readBack(file, source.stx_size, target, watch);
     // Reading may have touched the times.
     return hasFailed(result) ? result : atTarget(keepTimes(target.get(), source));
 }
@@ -129,6 +174,22 @@ CopyResult finishLink(At const& link, Status const& source, std::string const& t
 
 } // namespace
 
+void throwAtSource(int error, provider::StorageIRI const& source)
+{
+    if (error == EBUSY)
+        throwError(error, source, u"changed while it was moved, and stays");
+    if (error == EOPNOTSUPP)
+        throwError(error, source, u"a special file, which cannot be moved to another file system");
+    throwError(error, source);
+}
+
+void requireMoved(CopyResult const& result, provider::StorageIRI const& from, provider::StorageIRI const& to)
+{
+    if (result.outcome == CopyOutcome::SourceFailed)
+        throwAtSource(result.error, from);
+    requireCopied(result, from, to);
+}
+
 bool isUnchanged(Status const& before, Status const& now)
 {
     return hasSameContent(before, now) && isSameTime(before.stx_ctime, now.stx_ctime);
@@ -141,9 +202,10 @@ bool hasSameContent(Status const& before, Status const& now)
 }
 
 /// A difference is the fault of a source that changed meanwhile, if it did.
-CopyResult moveContent(FileDescriptor const& file, Status const& source, FileDescriptor const& target)
+CopyResult moveContent(FileDescriptor const& file, Status const& source, FileDescriptor const& target,
+                       MoveWatch const& watch)
 {
-    CopyResult const result = copyAll(file, source, target);
+    CopyResult const result = copyAll(file, source, target, watch);
     bool const isDifferent = result.outcome == CopyOutcome::TargetFailed && result.error == EIO;
     if (hasFailed(result) && !isDifferent)
         return result;
@@ -151,6 +213,8 @@ CopyResult moveContent(FileDescriptor const& file, Status const& source, FileDes
     int const error = getFullStatus(file, now);
     if (error != 0 || !isUnchanged(source, now))
         return atSource(error != 0 ? error : EBUSY);
+    if (!hasFailed(result))
+        watch.tellFile();
     return result;
 }
 

@@ -136,16 +136,52 @@ TEST_F(MvAcrossFileSystems, KeepsTheRulesOfReplacement)
     EXPECT_EQ(folder.read("other/a"), "new");
 }
 
-TEST_F(MvAcrossFileSystems, KeepsTheSourceWhenNotAllCanBeCopied)
+TEST_F(MvAcrossFileSystems, LeavesBothEndsWhenNotAllCanBeMoved)
+{
+    makeFolder("a/b");
+    folder.write("a/f", "1");
+    makePipe("a/b/pipe");
+    runFailing({"mv", "a", "other"},
+               "storage: mv: a/b/pipe: a special file, which cannot be moved to another file system\n");
+    EXPECT_EQ(folder.read("a/f"), "1");
+    EXPECT_TRUE(exists("a/b/pipe"));
+    EXPECT_EQ(countEntries("other"), 0U);
+}
+
+TEST_F(MvAcrossFileSystems, SaysWhatIsMountedInTheSource)
+{
+    makeFolder("a");
+    if (!mount("a/b", "1m"))
+        GTEST_SKIP() << "file systems may not be mounted here";
+    runFailing({"mv", "a", "other"}, "storage: mv: a/b: something is mounted on it\n");
+    EXPECT_EQ(countEntries("other"), 0U);
+}
+
+TEST_F(MvAcrossFileSystems, MovesLinksAndScratchFilesInAFolder)
+{
+    constexpr char const* scratch = "7e9f4b5e-0d6c-4a57-8f2e-1b9d3c5a7e90.tmp.bak";
+    makeFolder("a");
+    folder.write("a/f", "1");
+    folder.write(std::string("a/") + scratch, "2");
+    makeLink("f", "a/link");
+    makeLink("nowhere", "a/broken");
+    EXPECT_EQ(runWell({"mv", "-v", "a", "other"}), "a -> other/a\n");
+    EXPECT_FALSE(exists("a"));
+    EXPECT_EQ(folder.read(std::string("other/a/") + scratch), "2");
+    EXPECT_EQ(std::filesystem::read_symlink(folder / "other/a/link"), "f");
+    EXPECT_EQ(std::filesystem::read_symlink(folder / "other/a/broken"), "nowhere");
+}
+
+TEST_F(MvAcrossFileSystems, KeepsTimes)
 {
     makeFolder("a");
     folder.write("a/f", "1");
-    makeLink("f", "a/link");
-    runFailing({"mv", "a", "other"},
-               "storage: mv: a/link: a link, which would become a file\n"
-               "storage: mv: a: stays, because not all of it could be copied; what could is in other/a\n");
-    EXPECT_EQ(folder.read("a/f"), "1");
-    EXPECT_TRUE(exists("a/link"));
+    setTime("a/f", 1'100'000'000, 987'654'321);
+    setTime("a", 1'100'000'000, 987'654'321);
+    auto const time = std::filesystem::last_write_time(folder / "a");
+    runWell({"mv", "a", "other"});
+    EXPECT_EQ(std::filesystem::last_write_time(folder / "other/a"), time);
+    EXPECT_EQ(std::filesystem::last_write_time(folder / "other/a/f"), time);
 }
 
 TEST_F(MvAcrossFileSystems, KeepsTheSourceWhenTheTargetIsFull)
