@@ -149,6 +149,8 @@ int main(int argc, char** argv)
 {
     occupyStandardStreams();
     std::signal(SIGPIPE, SIG_IGN);
+    // A write beyond the limit for the size of a file is to fail, and to leave no scratch file, rather than end this.
+    std::signal(SIGXFSZ, SIG_IGN);
     catchInterrupts();
     return finish("", [&] { return run(argc, argv); });
 }
