@@ -19,7 +19,8 @@ struct StayingEntry
 /// Removes a local folder as `LocalProvider` does with `removeFolderRecursively`, and names each entry that stays.
 ///
 /// Meaning: empty when all is gone. A folder that stays for what it holds is not named. Who would rather go through the
-/// rest by the paths of its entries could be led elsewhere by whoever swaps folders for links meanwhile.
+/// rest by the paths of its entries could be led elsewhere by whoever swaps folders for links meanwhile. The setting
+/// `root` of a provider is not known here: any local folder will do.
 ///
 /// Errors: `provider::Exception` as from the provider where the folder itself cannot be entered or is none; nothing is
 /// removed then.

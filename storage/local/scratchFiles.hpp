@@ -17,20 +17,25 @@ enum class ScratchFileState
 
 /// Tells whether a writer may still need a scratch file of a local folder, and changes nothing.
 ///
-/// Meaning: a file is in use while any process, of whichever user, has it open or mapped; the providers of this library
-/// keep theirs open up to the rename. The kernel tells by refusing a lease. Processes of other machines that have the
-/// file open over a network are not seen.
-/// `age` is how long ago the content of the file must have changed last.
+/// Meaning: a file is in use while any process, of whichever user, has it open or mapped. The kernel tells by refusing
+/// a lease. Processes of other machines that have the file open over a network are not seen. Who closes a scratch file
+/// before it takes its place relies on its age alone.
+/// Moves to other file systems leave folders and links of such names, too. A folder is in use while any file in it is,
+/// and recent while anything in it is; of a link its age alone can be told. The setting `root` of a provider is not
+/// known here: any local location will do.
+/// `age` is how long ago the content of the file must have changed last; for a link, and for what a folder holds, how
+/// long ago anything about it must have.
 ///
 /// Errors: `provider::Exception`. `InvalidLocation` for a location whose last name is not `<uuid>.tmp.bak`, or that
-/// names no local file. `ResourceNotFound` where no file stands, a link included. `PermissionDenied` for a file of
+/// names no local file. `ResourceNotFound` where neither file, folder nor link stands. `PermissionDenied` for a file of
 /// another user: only its owner and root are told who uses it. `UnsupportedOperation` on file systems without leases,
 /// as most of those over a network are.
-/// Cost: holds the lease for a moment; a process that opens the file just then waits for that long.
+/// Cost: holds the lease for a moment; a process that opens the file just then waits for that long, or fails with
+/// `EWOULDBLOCK` if it does not want to wait. A folder is read with all it holds.
 FOUNDATION_API ScratchFileState examineScratchFile(provider::StorageIRI const& file, std::chrono::seconds age);
 
-/// The same, and removes a file that is `Abandoned`, which nobody can open between the look and the removal. A file
-/// that is renamed from its scratch name meanwhile stays.
+/// The same, and removes what is `Abandoned`, a folder with all it holds. Nobody can open a file between the look and
+/// the removal; one that is renamed from its scratch name meanwhile stays.
 FOUNDATION_API ScratchFileState removeAbandonedScratchFile(provider::StorageIRI const& file, std::chrono::seconds age);
 
 } // namespace foundation::storage::local

@@ -54,26 +54,25 @@ public:
 
     bool visit(Place const& place, ListedName const& listed, std::size_t) override
     {
-        if (!listed.isFile)
-            return options_.isRecursive && kindOf(place, listed) == Kind::RegularFolder;
-        if (isScratchName(listed.name))
-            at(place, [&] { cleanFile(place); });
+        if (!isScratchName(listed.name))
+            return !listed.isFile && options_.isRecursive && kindOf(place, listed) == Kind::RegularFolder;
+        at(place, [&] { cleanEntry(place, kindOf(place, listed)); });
         return false;
     }
 
 private:
-    void cleanFile(Place const& place)
+    void cleanEntry(Place const& place, Kind kind)
     {
-        std::optional<Entry> const entry = described(place);
+        std::optional<Entry> const entry = described(place, kind);
         if (entry && stateAfterCleaning(place) == ScratchFileState::Abandoned)
             tell(place, *entry);
     }
 
     /// Before it is removed.
-    std::optional<Entry> described(Place const& place) const
+    std::optional<Entry> described(Place const& place, Kind kind) const
     {
         try {
-            return options_.isJSON ? describeEntry(place) : bareEntry(place, Kind::RegularFile);
+            return options_.isJSON ? describeEntry(place) : bareEntry(place, kind);
         } catch (Failure const&) {
             if (kindOf(place) == Kind::None)
                 return std::nullopt;

@@ -5,8 +5,11 @@
 #include <tools/storage/entries.hpp>
 #include <tools/storage/format.hpp>
 #include <tools/storage/physicalPath.hpp>
+#include <tools/storage/scratchName.hpp>
 
+#include <algorithm>
 #include <fmt/format.h>
+#include <limits>
 #include <memory>
 #include <set>
 
@@ -18,6 +21,7 @@ struct Options
 {
     std::vector<std::string> paths{"."};
     std::optional<std::size_t> maximumDepth;
+    bool isAll = false;
     bool isSummary = false;
     bool hasTotal = false;
     bool isHumanReadable = false;
@@ -96,7 +100,8 @@ private:
     Options const& options_;
     CountedPaths counted_;
     bool meetsCounted_ = false;
-    std::vector<Sum> folders_; ///< from the argument down to where the walk is
+    std::vector<Sum> folders_;                                          ///< from the argument down to where the walk is
+    std::size_t hiddenDepth_ = std::numeric_limits<std::size_t>::max(); ///< of the scratch folder around the walk
     Sum total_;
 };
 
@@ -124,13 +129,15 @@ bool Summation::wasCounted(Place const& place) const
 }
 
 /// What a listing calls a file or a folder may be a link to one.
-bool Summation::visit(Place const& place, ListedName const& listed, std::size_t)
+bool Summation::visit(Place const& place, ListedName const& listed, std::size_t depth)
 {
     Kind const kind = kindOf(place, listed);
     if ((kind != Kind::RegularFile && kind != Kind::RegularFolder) || wasCounted(place))
         return false;
     if (kind == Kind::RegularFile)
         add({listed.size ? *listed.size : describeEntry(place).size.value_or(0), 1});
+    else if (!options_.isAll && isScratchName(listed.name))
+        hiddenDepth_ = std::min(hiddenDepth_, depth);
     return kind == Kind::RegularFolder;
 }
 
@@ -139,8 +146,10 @@ void Summation::leave(Place const& folder, std::size_t depth)
     Sum const sum = folders_.back();
     folders_.pop_back();
     add(sum);
-    if (options_.shows(depth))
+    if (options_.shows(depth) && depth < hiddenDepth_)
         print(folder, Kind::RegularFolder, sum);
+    if (depth <= hiddenDepth_)
+        hiddenDepth_ = std::numeric_limits<std::size_t>::max();
 }
 
 void Summation::print(Place const& place, Kind kind, Sum const& sum)
@@ -186,6 +195,7 @@ void sumUpAll(Session& session, Options const& options)
 Action defineDu(CLI::App& app)
 {
     auto const options = std::make_shared<Options>();
+    addFlag(app, "-a,--all", options->isAll, "Also print lines for scratch folders, of moves that are not finished");
     addFlag(app, "-s,--summarize", options->isSummary, "Print a line for each path that is given, and no others");
     addNumber(app, "-d,--max-depth", "N", "Print lines for folders down to this depth; all count",
               options->maximumDepth);

@@ -19,6 +19,7 @@ constinit SystemCalls const realSystemCalls{
                   std::size_t size) { return static_cast<int>(::syscall(SYS_openat2, folder, path, how, size)); },
     .close = ::close,
     .dup = [](int descriptor) { return ::fcntl(descriptor, F_DUPFD_CLOEXEC, 0); },
+    .fcntl = [](int descriptor, int command, int argument) { return ::fcntl(descriptor, command, argument); },
     .read = ::read,
     .write = ::write,
     .lseek = ::lseek,

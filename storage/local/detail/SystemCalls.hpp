@@ -23,6 +23,7 @@ struct SystemCalls
     int (*openat2)(int folder, char const* path, open_how const* how, std::size_t size);
     int (*close)(int descriptor);
     int (*dup)(int descriptor);
+    int (*fcntl)(int descriptor, int command, int argument);
     ssize_t (*read)(int descriptor, void* buffer, std::size_t count);
     ssize_t (*write)(int descriptor, void const* data, std::size_t count);
     off_t (*lseek)(int descriptor, off_t offset, int origin);

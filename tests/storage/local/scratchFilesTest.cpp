@@ -3,15 +3,19 @@
 #include <gtest/gtest.h>
 
 #include <storage/local/LocalProvider.hpp>
+#include <tests/storage/local/ReplacedSystemCalls.hpp>
 #include <tests/support/TemporaryFolder.hpp>
 #include <tests/support/failureOf.hpp>
 
+#include <array>
+#include <cerrno>
 #include <chrono>
 #include <csignal>
 #include <fcntl.h>
 #include <filesystem>
 #include <string>
 #include <sys/mman.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -21,8 +25,11 @@ namespace {
 namespace fs = std::filesystem;
 using namespace provider;
 using namespace std::chrono_literals;
+using detail::realSystemCalls;
 using tests::support::failure;
 using tests::support::failureOf;
+using tests::support::failWith;
+using tests::support::ReplacedSystemCalls;
 using tests::support::TemporaryFolder;
 
 class ScratchFiles : public testing::Test
@@ -115,7 +122,7 @@ TEST_F(ScratchFiles, StayWhileATransactionIsOpen)
     EXPECT_TRUE(fs::exists(other / "file"));
 }
 
-TEST_F(ScratchFiles, AreFilesOfTheirFormOnly)
+TEST_F(ScratchFiles, AreOfTheirFormOnly)
 {
     folder.write("file", "");
     EXPECT_EQ(failureOf([&] { removeAbandonedScratchFile(folder.iri(u"file"), 0s); }),
@@ -123,12 +130,100 @@ TEST_F(ScratchFiles, AreFilesOfTheirFormOnly)
     fs::remove(folder / name);
     auto const missing = failure(ErrorCode::ResourceNotFound, iri());
     EXPECT_EQ(failureOf([&] { removeAbandonedScratchFile(iri(), 0s); }), missing);
-    fs::create_symlink("file", folder / name);
-    EXPECT_EQ(failureOf([&] { removeAbandonedScratchFile(iri(), 0s); }), missing);
-    fs::remove(folder / name);
-    fs::create_directory(folder / name);
+    ASSERT_EQ(::mkfifo((folder / name).c_str(), 0600), 0);
     EXPECT_EQ(failureOf([&] { removeAbandonedScratchFile(iri(), 0s); }), missing);
     EXPECT_TRUE(fs::exists(folder / name));
+}
+
+TEST_F(ScratchFiles, AreLinksThatAreOldThemselves)
+{
+    fs::remove(folder / name);
+    folder.write("file", "");
+    fs::create_symlink("file", folder / name);
+    std::array<timespec, 2> const longAgo{};
+    ASSERT_EQ(::utimensat(AT_FDCWD, (folder / name).c_str(), longAgo.data(), AT_SYMLINK_NOFOLLOW), 0);
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 1h), ScratchFileState::Recent) << "it was made just now";
+    EXPECT_EQ(examineScratchFile(iri(), 0s), ScratchFileState::Abandoned);
+    EXPECT_TRUE(fs::is_symlink(folder / name));
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 0s), ScratchFileState::Abandoned);
+    EXPECT_FALSE(fs::is_symlink(folder / name));
+    EXPECT_TRUE(fs::exists(folder / "file"));
+}
+
+/// What a move to another file system leaves that was killed.
+class ScratchFolders : public ScratchFiles
+{
+protected:
+    ScratchFolders()
+    {
+        fs::remove(folder / name);
+        fs::create_directories(folder / name / "a/b");
+        folder.write(name + "/a/b/inner", "content");
+        fs::create_symlink("nothing", folder / name / "link");
+    }
+};
+
+TEST_F(ScratchFolders, AreRemovedWhole)
+{
+    EXPECT_EQ(examineScratchFile(iri(), 0s), ScratchFileState::Abandoned);
+    EXPECT_EQ(folder.read(name + "/a/b/inner"), "content");
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 0s), ScratchFileState::Abandoned);
+    EXPECT_FALSE(fs::exists(folder / name));
+}
+
+TEST_F(ScratchFolders, StayWhileTheyAreYoungWhateverTimesWereCopied)
+{
+    for (char const* const entry : {"", "/a", "/a/b", "/a/b/inner"})
+        fs::last_write_time(folder / (name + entry), fs::file_time_type::clock::now() - 24h);
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 1h), ScratchFileState::Recent);
+    EXPECT_EQ(folder.read(name + "/a/b/inner"), "content");
+}
+
+TEST_F(ScratchFolders, StayWhileAFileInThemIsOpen)
+{
+    int const descriptor = ::open((folder / (name + "/a/b/inner")).c_str(), O_RDONLY | O_CLOEXEC);
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 0s), ScratchFileState::InUse);
+    EXPECT_EQ(folder.read(name + "/a/b/inner"), "content");
+    EXPECT_TRUE(fs::is_symlink(folder / (name + "/link")));
+    ::close(descriptor);
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 0s), ScratchFileState::Abandoned);
+}
+
+int leaseError;
+
+class ScratchFilesWithRefusedLeases : public ScratchFiles
+{
+protected:
+    ScratchFilesWithRefusedLeases()
+    {
+        replaced->fcntl = [](int descriptor, int command, int argument) {
+            return command == F_SETLEASE ? failWith(leaseError) : realSystemCalls.fcntl(descriptor, command, argument);
+        };
+    }
+
+    ReplacedSystemCalls replaced;
+};
+
+TEST_F(ScratchFilesWithRefusedLeases, CannotBeJudgedOnFileSystemsWithoutLeases)
+{
+    leaseError = EINVAL;
+    EXPECT_EQ(failureOf([&] { removeAbandonedScratchFile(iri(), 0s); }),
+              failure(ErrorCode::UnsupportedOperation, iri()));
+    EXPECT_EQ(folder.read(name), "content");
+}
+
+TEST_F(ScratchFilesWithRefusedLeases, AreInUse)
+{
+    leaseError = EWOULDBLOCK;
+    EXPECT_EQ(removeAbandonedScratchFile(iri(), 0s), ScratchFileState::InUse);
+    EXPECT_EQ(folder.read(name), "content");
+}
+
+TEST_F(ScratchFilesWithRefusedLeases, CannotBeJudgedWhenOfOthers)
+{
+    leaseError = EACCES;
+    EXPECT_EQ(failureOf([&] { removeAbandonedScratchFile(iri(), 0s); }), failure(ErrorCode::PermissionDenied, iri()));
+    EXPECT_EQ(folder.read(name), "content");
 }
 
 } // namespace

@@ -92,6 +92,42 @@ TEST_F(Clean, LeavesWhatTheToolItselfIsWriting)
     EXPECT_EQ(folder.read("file"), "whole");
 }
 
+/// Moves to other file systems leave them that were killed.
+TEST_F(Clean, RemovesScratchFoldersAndLinks)
+{
+    makeFolder(old + "/a");
+    folder.write(old + "/a/file", "half");
+    makeLink("missing", other);
+    EXPECT_EQ(runWell({"clean", "."}), "");
+    EXPECT_EQ(countEntries(), 2U) << "they were made just now";
+    EXPECT_NE(runWell({"clean", "--dry-run", "--older-than", "0s", "."}).find("./" + old + "\n"), std::string::npos);
+    EXPECT_EQ(countEntries(), 2U);
+    runWell({"clean", "--older-than", "0s", "."});
+    EXPECT_EQ(countEntries(), 0U);
+}
+
+TEST_F(Clean, RemovesLinksToFoldersAndNotWhatTheyLeadTo)
+{
+    makeFolder("a");
+    makeScratch("a/" + old);
+    makeLink("a", other);
+    runWell({"clean", "--older-than", "0s", "."});
+    EXPECT_EQ(countEntries(), 1U);
+    EXPECT_TRUE(exists("a/" + old));
+}
+
+TEST_F(Clean, LeavesAScratchFolderInWhichAFileIsOpen)
+{
+    makeFolder(old);
+    folder.write(old + "/file", "half");
+    int const descriptor = ::open((folder / old / "file").c_str(), O_RDONLY | O_CLOEXEC);
+    runWell({"clean", "--older-than", "0s", "."});
+    EXPECT_TRUE(exists(old + "/file"));
+    ::close(descriptor);
+    runWell({"clean", "--older-than", "0s", "."});
+    EXPECT_FALSE(exists(old));
+}
+
 TEST_F(Clean, TellsWhatItRemovedAsJSON)
 {
     makeScratch(old);

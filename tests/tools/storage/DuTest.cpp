@@ -36,6 +36,17 @@ protected:
     }
 };
 
+TEST_F(Du, PrintsNoLinesForScratchFoldersUnlessAsked)
+{
+    makeTree();
+    std::string const scratch = "a/b/7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak";
+    makeFolder(scratch + "/d");
+    folder.write(scratch + "/d/f", "12345");
+    EXPECT_EQ(sums({"a"}), (Sums{{"a/b/c", "100"}, {"a/b", "115"}, {"a", "116"}}));
+    Sums const all = sums({"--all", "a"});
+    EXPECT_EQ(all, (Sums{{"a/b/c", "100"}, {"a/b", "115"}, {"a", "116"}, {scratch, "5"}, {scratch + "/d", "5"}}));
+}
+
 TEST_F(Du, SumsUpFilesFolderByFolderFromBelow)
 {
     makeTree();

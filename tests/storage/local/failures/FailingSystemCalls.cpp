@@ -163,6 +163,7 @@ constexpr std::array entries{
     Entry{"openat2", &Intercepted<&SystemCalls::openat2>::putInto},
     Entry{"close", &Intercepted<&SystemCalls::close>::putInto},
     Entry{"dup", &Intercepted<&SystemCalls::dup>::putInto},
+    Entry{"fcntl", &Intercepted<&SystemCalls::fcntl>::putInto},
     Entry{"read", &Intercepted<&SystemCalls::read>::putInto},
     Entry{"write", &Intercepted<&SystemCalls::write>::putInto},
     Entry{"lseek", &Intercepted<&SystemCalls::lseek>::putInto},

@@ -42,6 +42,8 @@ Scene::Scene(bool confined) : folder_(fastFolder())
     folder_.write("from/long", longContent());
     fs::resize_file(folder_.write("from/sparse", "x"), 1 << 16);
     folder_.write("from/7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak", "of another writer");
+    fs::create_directory(folder_ / "from/7e9f4b5e-0000-4000-8000-0123456789ac.tmp.bak");
+    folder_.write("from/7e9f4b5e-0000-4000-8000-0123456789ac.tmp.bak/file", "of a move");
     folder_.write("from/folder/inner", "inner");
     folder_.write("from/folder/deeper/innermost", "innermost");
     fs::create_symlink("file", folder_ / "from/link");

@@ -54,6 +54,8 @@ constexpr Case cases[] = {
      "where nobody knows the holes or the end, all is copied"},
     {"moveScratchFile", "openat2?", scratch, isForbidden, Ignored::WithSameResult,
      "a file that may not be read is synced by whoever may write it"},
+    {"(examine|removeAbandoned)ScratchF.*", "openat", ".*/(file|7e9f4b5e.*)", isForbidden, Ignored::WithSameResult,
+     "a file that may not be read can be asked about by whoever may write it"},
     {"copyFileOntoItself", "close", "from/second name", any, Ignored::WithSameResult, "nothing was written"},
     {"abort|drop", "close", scratch, any, Ignored::WithSameResult, "the content is not wanted"},
     {"drop", "unlinkat", scratch, any, Ignored::WithSameResult, "a destructor has nobody to tell"},

@@ -1,10 +1,13 @@
 #include <tests/storage/local/failures/operations.hpp>
 
+#include <storage/local/scratchFiles.hpp>
+
 #include <boost/any.hpp>
 #include <boost/date_time/posix_time/posix_time_types.hpp>
 #include <boost/property_tree/ptree.hpp>
 
 #include <array>
+#include <chrono>
 #include <memory>
 #include <set>
 #include <sstream>
@@ -15,6 +18,16 @@ namespace foundation::tests::support {
 using namespace storage::provider;
 
 namespace {
+
+using namespace std::chrono_literals;
+
+constexpr char16_t const* scratchName = u"from/7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak";
+constexpr char16_t const* scratchFolderName = u"from/7e9f4b5e-0000-4000-8000-0123456789ac.tmp.bak";
+
+std::string stateText(storage::local::ScratchFileState state)
+{
+    return std::to_string(static_cast<int>(state));
+}
 
 /// An operation on one location.
 Operation query(std::string name, std::u16string at, std::function<std::string(Scene const&)> run)
@@ -224,6 +237,17 @@ std::vector<Operation> entryOperations()
                   auto const attributes = s.provider().getExtendedAttributes(s.at(u"from/file"));
                   return text(boost::any_cast<std::uint32_t>(attributes.getAttribute("links")));
               }),
+        query("examineScratchFile", scratchName,
+              [](auto& s) { return stateText(storage::local::examineScratchFile(s.at(scratchName), 0s)); }),
+        query("removeAbandonedScratchFile", scratchName,
+              [](auto& s) { return stateText(storage::local::removeAbandonedScratchFile(s.at(scratchName), 0s)); }),
+        query("examineScratchFolder", scratchFolderName,
+              [](auto& s) { return stateText(storage::local::examineScratchFile(s.at(scratchFolderName), 0s)); }),
+        leaving(Leaves::SomeEntries,
+                query("removeAbandonedScratchFolder", scratchFolderName,
+                      [](auto& s) {
+                          return stateText(storage::local::removeAbandonedScratchFile(s.at(scratchFolderName), 0s));
+                      })),
         change("setLastModified", u"from/file",
                [](auto& s) { s.provider().setLastModified(s.at(u"from/file"), someTime()); }),
         change("setWritable", u"from/folder", [](auto& s) { s.provider().setWritable(s.at(u"from/folder"), true); }),
@@ -251,7 +275,7 @@ std::vector<Operation> transferOperations()
         acrossFileSystems(moveFolder("moveFolder", u"from/folder", u"to/new", Preserve)),
         move("moveFile", u"from/file", u"to/new", Preserve),
         lackingNoReplace(move("moveFile", u"from/file", u"to/new", Preserve)),
-        move("moveScratchFile", u"from/7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak", u"to/new", NoClobber),
+        move("moveScratchFile", scratchName, u"to/new", NoClobber),
         move("moveFileReplacing", u"from/file", u"to/existing", Overwrite),
         move("moveFileOntoOtherName", u"from/file", u"from/second name", Overwrite),
         move("moveFileOntoItself", u"from/file", u"from/file", Overwrite),
