@@ -76,7 +76,7 @@ void CopyRun::lookAround()
     Progress& progress = session_.progress();
     progress.update();
     if (!announced_.empty() && progress.hasBegun())
-        counter_.emplace(std::exchange(announced_, {}), progress);
+        counter_.emplace(session_.stores(), std::exchange(announced_, {}), progress);
 }
 
 void CopyRun::copyFile(Place source, Place target, TargetState state)

@@ -13,14 +13,16 @@ constexpr std::ptrdiff_t maximumOpenListings = 100;
 
 } // namespace
 
-ListedName::ListedName(provider::FolderEntry const& entry) : name(entry.getName()), isFile(entry.isFile())
+ListedName listedNameOf(provider::FolderEntry const& entry)
 {
+    ListedName listed{entry.getName(), entry.isFile()};
     if (auto const& file = entry.getFileAttributes()) {
-        size = file->getSize();
-        modified = file->getLastModified();
+        listed.size = file->getSize();
+        listed.modified = file->getLastModified();
     } else if (auto const& folder = entry.getFolderAttributes()) {
-        modified = folder->getLastModified();
+        listed.modified = folder->getLastModified();
     }
+    return listed;
 }
 
 FolderLevel::FolderLevel(Place folder, std::optional<Place> counterpart, Listing kind)
@@ -50,7 +52,7 @@ ListedName FolderLevel::next()
         return entry;
     }
     isEntryTaken_ = true;
-    return ListedName(listing_->entry());
+    return listedNameOf(listing_->entry());
 }
 
 /// A listing that fails is through: the walk goes on elsewhere.

@@ -4,6 +4,7 @@
 #include <storage/provider/IFolderEntryIterator.hpp>
 #include <tools/storage/Failure.hpp>
 #include <tools/storage/Place.hpp>
+#include <tools/storage/kinds.hpp>
 
 #include <cstddef>
 #include <cstdint>
@@ -17,13 +18,14 @@ namespace foundation::storage::tool {
 /// What a listing says of an entry; size and time are empty where it was not asked for attributes.
 struct ListedName
 {
-    explicit ListedName(provider::FolderEntry const& entry);
-
     std::u16string name;
     bool isFile;
-    std::optional<std::uint64_t> size;
-    std::optional<boost::posix_time::ptime> modified;
+    std::optional<std::uint64_t> size = {};
+    std::optional<boost::posix_time::ptime> modified = {};
+    std::optional<Kind> kind = {}; ///< only where the listing tells
 };
+
+ListedName listedNameOf(provider::FolderEntry const& entry);
 
 enum class Listing
 {
@@ -86,6 +88,7 @@ public:
     bool empty() const { return levels_.empty(); }
     std::size_t depth() const { return levels_.size(); }
     FolderLevel& innermost() { return levels_.back(); }
+    FolderLevel const& innermost() const { return levels_.back(); }
 
     void enter(Place folder, std::optional<Place> counterpart = std::nullopt);
     void leave() { levels_.pop_back(); }

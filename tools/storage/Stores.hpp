@@ -29,6 +29,9 @@ public:
     /// the failure does not repeat.
     provider::StorageItem openItem(std::string const& argument) const;
 
+    /// The item at a location that was not written by a user.
+    provider::StorageItem itemAt(provider::StorageIRI const& location) const { return registry_.open(location); }
+
     Place open(std::string const& argument) const { return Place(openItem(argument), argument); }
 
 private:

@@ -11,8 +11,8 @@
 
 namespace foundation::storage::tool {
 
-TreeCounter::TreeCounter(std::vector<Place> places, Progress& progress)
-    : places_(std::move(places)), progress_(progress)
+TreeCounter::TreeCounter(Stores const& stores, std::vector<Place> places, Progress& progress)
+    : stores_(stores), places_(std::move(places)), progress_(progress)
 {
     HeldInterrupts const held;
     thread_ = std::jthread([this](std::stop_token const& stop) { count(stop); });
@@ -43,30 +43,30 @@ void TreeCounter::countPlace(Place const& place, std::stop_token const& stop)
 
 void TreeCounter::countBelow(Place const& folder, std::stop_token const& stop)
 {
-    FolderStack levels(Listing::WithAttributes);
-    levels.enter(folder);
-    while (!levels.empty() && !stop.stop_requested()) {
+    std::unique_ptr<TreeCursor> const tree = openTree(stores_, folder, Listing::WithAttributes);
+    for (bool isThrough = false; !isThrough && !stop.stop_requested();) {
         try {
-            countNext(levels);
+            isThrough = countNext(*tree);
         } catch (Failure const&) {
         }
     }
 }
 
-/// What a listing calls a folder may be a link to one.
-void TreeCounter::countNext(FolderStack& levels)
+/// Answers whether the walk is at its end.
+bool TreeCounter::countNext(TreeCursor& tree)
 {
-    FolderLevel& level = levels.innermost();
-    if (!level.hasNext())
-        return levels.leave();
-    ListedName const entry = level.next();
-    if (entry.isFile && isScratchName(entry.name))
-        return; // it is not copied either
-    if (entry.isFile)
-        return add(entry.size.value_or(0));
-    Place child = level.folder().child(entry.name);
-    if (kindOf(child) == Kind::RegularFolder)
-        levels.enter(std::move(child));
+    std::optional<ListedName> const entry = tree.next();
+    if (!entry && tree.depth() == 0)
+        return true;
+    if (!entry)
+        tree.leave();
+    else if (entry->isFile && isScratchName(entry->name))
+        return false; // it is not copied either
+    else if (entry->isFile)
+        add(entry->size.value_or(0));
+    else if (tree.kindOf(*entry) == Kind::RegularFolder)
+        tree.enter(*entry);
+    return false;
 }
 
 void TreeCounter::add(std::uint64_t bytes)

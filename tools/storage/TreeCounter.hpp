@@ -1,8 +1,9 @@
 #pragma once
 
-#include <tools/storage/FolderStack.hpp>
 #include <tools/storage/Place.hpp>
 #include <tools/storage/Progress.hpp>
+#include <tools/storage/Stores.hpp>
+#include <tools/storage/TreeCursor.hpp>
 
 #include <cstdint>
 #include <stop_token>
@@ -19,7 +20,7 @@ class TreeCounter
 {
 public:
     /// Starts to count: of a place that is a folder all that is below it.
-    TreeCounter(std::vector<Place> places, Progress& progress);
+    TreeCounter(Stores const& stores, std::vector<Place> places, Progress& progress);
 
     /// Stops counting.
     ~TreeCounter() = default;
@@ -30,9 +31,10 @@ private:
     void count(std::stop_token const& stop);
     void countPlace(Place const& place, std::stop_token const& stop);
     void countBelow(Place const& folder, std::stop_token const& stop);
-    void countNext(FolderStack& levels);
+    bool countNext(TreeCursor& tree);
     void add(std::uint64_t bytes);
 
+    Stores const& stores_;
     std::vector<Place> places_;
     Progress& progress_;
     Amount found_;

@@ -6,40 +6,60 @@ namespace foundation::storage::tool {
 
 namespace {
 
-void enter(FolderStack& levels, Place const& folder, TreeVisitor& visitor)
+class Walk
 {
-    levels.enter(folder);
-    visitor.enter();
-}
+public:
+    Walk(Session& session, std::unique_ptr<TreeCursor> tree, TreeVisitor& visitor)
+        : session_(session), tree_(std::move(tree)), visitor_(visitor)
+    {
+        visitor_.enter();
+    }
 
-void leave(FolderStack& levels, TreeVisitor& visitor)
-{
-    Place const folder = levels.innermost().folder();
-    levels.leave();
-    visitor.leave(folder, levels.depth());
-}
+    void run()
+    {
+        while (!isDone_) {
+            checkInterrupt();
+            session_.attempt([&] { step(); });
+        }
+    }
 
-void step(FolderStack& levels, TreeVisitor& visitor)
-{
-    FolderLevel& level = levels.innermost();
-    if (!level.hasNext())
-        return leave(levels, visitor);
-    ListedName const listed = level.next();
-    Place const place = level.folder().child(listed.name);
-    if (visitor.visit(place, listed, levels.depth()))
-        enter(levels, place, visitor);
-}
+private:
+    void step()
+    {
+        std::optional<ListedName> const listed = tree_->next();
+        if (!listed)
+            leave();
+        else if (visitor_.visit(*tree_, *listed) && tree_->enter(*listed))
+            visitor_.enter();
+    }
+
+    void leave()
+    {
+        std::size_t const depth = tree_->depth();
+        visitor_.leave(*tree_);
+        isDone_ = depth == 0;
+        if (isDone_)
+            return;
+        try {
+            tree_->leave();
+        } catch (Failure const&) {
+            for (std::size_t lost = tree_->depth() + 1; lost < depth; ++lost)
+                visitor_.lose();
+            throw;
+        }
+    }
+
+    Session& session_;
+    std::unique_ptr<TreeCursor> tree_;
+    TreeVisitor& visitor_;
+    bool isDone_ = false;
+};
 
 } // namespace
 
-void walkTree(Session& session, Place const& folder, Listing kind, TreeVisitor& visitor)
+void walkTree(Session& session, Place const& folder, Listing listing, TreeVisitor& visitor)
 {
-    FolderStack levels(kind);
-    session.attempt([&] { enter(levels, folder, visitor); });
-    while (!levels.empty()) {
-        checkInterrupt();
-        session.attempt([&] { step(levels, visitor); });
-    }
+    session.attempt([&] { Walk(session, openTree(session.stores(), folder, listing), visitor).run(); });
 }
 
 } // namespace foundation::storage::tool

@@ -1,8 +1,8 @@
 #pragma once
 
-#include <tools/storage/FolderStack.hpp>
 #include <tools/storage/Place.hpp>
 #include <tools/storage/Session.hpp>
+#include <tools/storage/TreeCursor.hpp>
 
 #include <cstddef>
 
@@ -14,17 +14,19 @@ class TreeVisitor
 public:
     virtual ~TreeVisitor() = default;
 
-    /// For each entry, of depth 1 in the folder where the walk starts. Answers whether to go into it, which must be for
-    /// folders alone.
-    virtual bool visit(Place const& place, ListedName const& listed, std::size_t depth) = 0;
+    /// For each entry of the folder where the walk stands. Answers whether to go into it, which must be for folders
+    /// alone.
+    virtual bool visit(TreeCursor& tree, ListedName const& listed) = 0;
 
-    /// For each folder that can be listed, before its entries and after all below it.
+    /// For each folder that can be listed, before its entries and after all below it. The walk stands in it, but for a
+    /// folder that was moved away meanwhile, for which nothing is known any more.
     virtual void enter() {}
-    virtual void leave([[maybe_unused]] Place const& folder, [[maybe_unused]] std::size_t depth) {}
+    virtual void leave([[maybe_unused]] TreeCursor const& tree) {}
+    virtual void lose() {}
 };
 
 /// Walks through all that is below a folder, depth first and in the order of the store. Memory grows with the depth
-/// alone, as with `FolderStack`.
-void walkTree(Session& session, Place const& folder, Listing kind, TreeVisitor& visitor);
+/// alone, as with `TreeCursor`.
+void walkTree(Session& session, Place const& folder, Listing listing, TreeVisitor& visitor);
 
 } // namespace foundation::storage::tool

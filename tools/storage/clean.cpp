@@ -52,20 +52,24 @@ public:
         walkTree(session_, folder, Listing::NamesOnly, *this);
     }
 
-    bool visit(Place const& place, ListedName const& listed, std::size_t) override
+    bool visit(TreeCursor& tree, ListedName const& listed) override
     {
+        Kind const kind = tree.kindOf(listed);
         if (!isScratchName(listed.name))
-            return !listed.isFile && options_.isRecursive && kindOf(place, listed) == Kind::RegularFolder;
-        at(place, [&] { cleanEntry(place, kindOf(place, listed)); });
+            return options_.isRecursive && kind == Kind::RegularFolder;
+        Place const place = tree.workingPlaceOf(listed);
+        at(place, [&] { cleanEntry(place, kind, tree.placeOf(listed)); });
         return false;
     }
 
 private:
-    void cleanEntry(Place const& place, Kind kind)
+    void cleanEntry(Place const& place, Kind kind, Place const& shown)
     {
-        std::optional<Entry> const entry = described(place, kind);
-        if (entry && stateAfterCleaning(place) == ScratchFileState::Abandoned)
-            tell(place, *entry);
+        std::optional<Entry> entry = described(place, kind);
+        if (!entry || stateAfterCleaning(place) != ScratchFileState::Abandoned)
+            return;
+        entry->location = shown.item().getLocation();
+        tell(shown, *entry);
     }
 
     /// Before it is removed.

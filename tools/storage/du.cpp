@@ -86,14 +86,17 @@ public:
     void sumUp(Place const& root);
     void printTotal();
 
-    bool visit(Place const& place, ListedName const& listed, std::size_t depth) override;
+    bool visit(TreeCursor& tree, ListedName const& listed) override;
     void enter() override { folders_.emplace_back(); }
-    void leave(Place const& folder, std::size_t depth) override;
+    void leave(TreeCursor const& tree) override;
+    void lose() override { add(takeInnermost()); }
 
 private:
-    bool wasCounted(Place const& place) const;
+    bool wasCounted(TreeCursor const& tree, ListedName const& listed) const;
+    Sum takeInnermost();
     void add(Sum const& sum) { (folders_.empty() ? total_ : folders_.back()) += sum; }
     void print(Place const& place, Kind kind, Sum const& sum);
+    void printLine(std::string const& text, Sum const& sum);
     void printSize(Sum const& sum);
 
     Session& session_;
@@ -123,46 +126,59 @@ void Summation::sumUp(Place const& root)
     counted_.add(path);
 }
 
-bool Summation::wasCounted(Place const& place) const
+bool Summation::wasCounted(TreeCursor const& tree, ListedName const& listed) const
 {
-    return meetsCounted_ && counted_.contains(physicalPath(place));
+    return meetsCounted_ && counted_.contains(physicalPath(tree.placeOf(listed)));
 }
 
 /// What a listing calls a file or a folder may be a link to one.
-bool Summation::visit(Place const& place, ListedName const& listed, std::size_t depth)
+bool Summation::visit(TreeCursor& tree, ListedName const& listed)
 {
-    Kind const kind = kindOf(place, listed);
-    if ((kind != Kind::RegularFile && kind != Kind::RegularFolder) || wasCounted(place))
+    Kind const kind = tree.kindOf(listed);
+    if ((kind != Kind::RegularFile && kind != Kind::RegularFolder) || wasCounted(tree, listed))
         return false;
     if (kind == Kind::RegularFile)
-        add({listed.size ? *listed.size : describeEntry(place).size.value_or(0), 1});
+        add({listed.size ? *listed.size : describeEntry(tree.workingPlaceOf(listed)).size.value_or(0), 1});
     else if (!options_.isAll && isScratchName(listed.name))
-        hiddenDepth_ = std::min(hiddenDepth_, depth);
+        hiddenDepth_ = std::min(hiddenDepth_, tree.depth() + 1);
     return kind == Kind::RegularFolder;
 }
 
-void Summation::leave(Place const& folder, std::size_t depth)
+Sum Summation::takeInnermost()
 {
     Sum const sum = folders_.back();
     folders_.pop_back();
-    add(sum);
-    if (options_.shows(depth) && depth < hiddenDepth_)
-        print(folder, Kind::RegularFolder, sum);
-    if (depth <= hiddenDepth_)
+    if (folders_.size() <= hiddenDepth_)
         hiddenDepth_ = std::numeric_limits<std::size_t>::max();
+    return sum;
+}
+
+void Summation::leave(TreeCursor const& tree)
+{
+    bool const isShown = options_.shows(tree.depth()) && tree.depth() < hiddenDepth_;
+    Sum const sum = takeInnermost();
+    add(sum);
+    if (isShown && options_.isJSON)
+        print(tree.place(), Kind::RegularFolder, sum);
+    else if (isShown)
+        printLine(tree.text(), sum);
 }
 
 void Summation::print(Place const& place, Kind kind, Sum const& sum)
 {
-    if (!options_.isJSON) {
-        printSize(sum);
-        return session_.printName(place.text());
-    }
+    if (!options_.isJSON)
+        return printLine(place.text(), sum);
     Entry entry = bareEntry(place, kind);
     entry.size = sum.bytes;
     entry.files = sum.files;
     session_.output().write(toJSON(entry));
     session_.output().endLine();
+}
+
+void Summation::printLine(std::string const& text, Sum const& sum)
+{
+    printSize(sum);
+    session_.printName(text);
 }
 
 void Summation::printSize(Sum const& sum)
@@ -177,8 +193,7 @@ void Summation::printTotal()
         session_.output().write(fmt::format(R"({{"type":"total","size":{},"files":{}}})", total_.bytes, total_.files));
         session_.output().endLine();
     } else {
-        printSize(total_);
-        session_.printName("total");
+        printLine("total", total_);
     }
 }
 

@@ -50,26 +50,24 @@ bool fitsName(Options const& options, std::u16string const& name)
     return options.names.empty() || std::any_of(options.names.begin(), options.names.end(), matches);
 }
 
-bool fitsType(Options const& options, Entry const& entry)
+bool fitsType(Options const& options, Kind kind)
 {
-    auto const isIt = [&](std::string const& type) { return isOfType(entry.kind, type); };
+    auto const isIt = [&](std::string const& type) { return isOfType(kind, type); };
     return options.types.empty() || std::any_of(options.types.begin(), options.types.end(), isIt);
 }
 
-bool fitsSize(Options const& options, Entry const& entry)
+bool fitsSize(Options const& options, Kind kind, std::optional<std::uint64_t> size)
 {
-    auto const holds = [&](SizeTest const& test) {
-        return entry.kind == Kind::RegularFile && entry.size && test.holds(*entry.size);
-    };
+    auto const holds = [&](SizeTest const& test) { return kind == Kind::RegularFile && size && test.holds(*size); };
     return std::all_of(options.sizes.begin(), options.sizes.end(), holds);
 }
 
-bool fitsTime(Options const& options, Entry const& entry)
+bool fitsTime(Options const& options, std::optional<ptime> const& time)
 {
     if (!options.newer && !options.older)
         return true;
-    return entry.modified && !entry.modified->is_special() && (!options.newer || *entry.modified > *options.newer) &&
-           (!options.older || *entry.modified < *options.older);
+    return time && !time->is_special() && (!options.newer || *time > *options.newer) &&
+           (!options.older || *time < *options.older);
 }
 
 class Finder : public TreeVisitor
@@ -81,34 +79,46 @@ public:
     {
         Entry entry = options_.needsAttributes() ? describeEntry(root) : bareEntry(root, existingKindOf(root));
         entry.isWritable.reset(); // not known of what is listed
-        if (fitsName(options_, entry.name))
-            printFitting(root, entry);
+        bool const fits = fitsName(options_, entry.name) && fitsType(options_, entry.kind) &&
+                          fitsSize(options_, entry.kind, entry.size) && fitsTime(options_, entry.modified);
+        if (fits && options_.isJSON)
+            session_.printJSON(toJSON(entry));
+        else if (fits)
+            printName(root.text());
         if (leadsToFolder(entry.kind) && options_.maximumDepth != 0U)
             walkTree(session_, root, options_.listing(), *this);
     }
 
-    bool visit(Place const& place, ListedName const& listed, std::size_t depth) override
+    bool visit(TreeCursor& tree, ListedName const& listed) override
     {
         if (!options_.isAll && isScratchName(listed.name))
             return false;
         bool const isCandidate = fitsName(options_, listed.name);
         bool const needsKind = !listed.isFile || (isCandidate && options_.needsKind());
-        Kind const kind = needsKind ? kindOf(place, listed) : apparentKind(listed);
-        if (isCandidate)
-            printFitting(place, describeEntry(place, kind, listed));
-        return kind == Kind::RegularFolder && (!options_.maximumDepth || depth < *options_.maximumDepth);
+        Kind const kind = needsKind ? tree.kindOf(listed) : apparentKind(listed);
+        if (isCandidate && fits(listed, kind))
+            print(tree, listed, kind);
+        return kind == Kind::RegularFolder && (!options_.maximumDepth || tree.depth() + 1 < *options_.maximumDepth);
     }
 
 private:
-    void printFitting(Place const& place, Entry const& entry)
+    bool fits(ListedName const& listed, Kind kind) const
     {
-        if (!fitsType(options_, entry) || !fitsSize(options_, entry) || !fitsTime(options_, entry))
-            return;
-        if (!options_.isJSON)
-            return session_.printName(place.text(), options_.endsInNull ? '\0' : '\n');
-        session_.output().write(toJSON(entry));
-        session_.output().endLine();
+        bool const isBroken = kind == Kind::BrokenSymlink;
+        return fitsType(options_, kind) && fitsSize(options_, kind, isBroken ? std::nullopt : listed.size) &&
+               fitsTime(options_, isBroken ? std::nullopt : listed.modified);
     }
+
+    /// The location of an entry takes long to make.
+    void print(TreeCursor const& tree, ListedName const& listed, Kind kind)
+    {
+        if (options_.isJSON)
+            session_.printJSON(toJSON(describeEntry(tree.placeOf(listed), kind, listed)));
+        else
+            printName(tree.textOf(listed));
+    }
+
+    void printName(std::string const& text) { session_.printName(text, options_.endsInNull ? '\0' : '\n'); }
 
     Session& session_;
     Options const& options_;

@@ -91,7 +91,7 @@ void Lister::listFolder(Place const& folder)
     session_.attempt([&] {
         for (; listing->hasEntry(); at(folder, [&] { listing->next(); })) {
             checkInterrupt();
-            session_.attempt([&] { listEntry(folder, ListedName(listing->entry())); });
+            session_.attempt([&] { listEntry(folder, listedNameOf(listing->entry())); });
         }
     });
     sortEntries(sorted_, options_.sort);

@@ -1,5 +1,5 @@
-#include <tools/storage/FolderStack.hpp>
 #include <tools/storage/Session.hpp>
+#include <tools/storage/TreeCursor.hpp>
 #include <tools/storage/TreeWalk.hpp>
 #include <tools/storage/arguments.hpp>
 #include <tools/storage/commands.hpp>
@@ -13,6 +13,7 @@
 #include <fl/filesystem/native_name.hpp>
 #include <fmt/format.h>
 #include <memory>
+#include <vector>
 
 namespace foundation::storage::tool {
 
@@ -57,12 +58,12 @@ public:
         walkTree(session_, root, Listing::WithAttributes, *this);
     }
 
-    bool visit(Place const& place, ListedName const& listed, std::size_t depth) override
+    bool visit(TreeCursor& tree, ListedName const& listed) override
     {
         if (!isAll_ && isScratchName(listed.name))
             return false;
-        Kind const kind = kindOf(place, listed);
-        print(describeEntry(place, kind, listed), depth);
+        Kind const kind = tree.kindOf(listed);
+        print(describeEntry(tree.placeOf(listed), kind, listed), tree.depth() + 1);
         return kind == Kind::RegularFolder;
     }
 
@@ -93,12 +94,13 @@ private:
     /// because the last one is drawn differently.
     struct Branch
     {
-        std::string indentation;
-        std::optional<ListedName> next;
+        std::size_t indentation; ///< how much of the whole stands there
+        std::optional<ListedName> next = {};
     };
 
-    void enter(Place const& folder, std::string indentation);
+    void begin();
     void lookAhead();
+    void leave();
     void drawNext();
     void drawFile(ListedName const& entry, bool isLast);
     void drawFolder(ListedName const& entry, bool isLast);
@@ -107,8 +109,9 @@ private:
     Session& session_;
     bool isAll_;
     Strokes strokes_;
-    FolderStack levels_;
-    std::deque<Branch> branches_;
+    std::unique_ptr<TreeCursor> tree_;
+    std::vector<Branch> branches_;
+    std::string indentation_;
     std::uint64_t folders_ = 0;
     std::uint64_t files_ = 0;
 };
@@ -123,7 +126,10 @@ void Drawing::draw(Place const& root)
     requireFolder(root);
     session_.output().write(printable(root.text()));
     session_.output().endLine();
-    session_.attempt([&] { enter(root, ""); });
+    session_.attempt([&] {
+        tree_ = openTree(session_.stores(), root, Listing::NamesOnly);
+        begin();
+    });
     while (!branches_.empty()) {
         checkInterrupt();
         session_.attempt([&] { drawNext(); });
@@ -132,31 +138,43 @@ void Drawing::draw(Place const& root)
     session_.output().endLine();
 }
 
-void Drawing::enter(Place const& folder, std::string indentation)
+void Drawing::begin()
 {
-    levels_.enter(folder);
-    branches_.push_back({std::move(indentation), std::nullopt});
+    branches_.push_back({indentation_.size()});
     lookAhead();
 }
 
 void Drawing::lookAhead()
 {
-    FolderLevel& level = levels_.innermost();
     branches_.back().next.reset();
-    while (!branches_.back().next && level.hasNext()) {
-        ListedName entry = level.next();
-        if (isAll_ || !isScratchName(entry.name))
-            branches_.back().next = std::move(entry);
+    do
+        branches_.back().next = tree_->next();
+    while (branches_.back().next && !isAll_ && isScratchName(branches_.back().next->name));
+}
+
+/// Folders that were moved away meanwhile are left, too.
+void Drawing::leave()
+{
+    branches_.pop_back();
+    if (branches_.empty())
+        return;
+    auto const follow = [&] {
+        branches_.resize(tree_->depth() + 1, Branch{});
+        indentation_.resize(branches_.back().indentation);
+    };
+    try {
+        tree_->leave();
+    } catch (Failure const&) {
+        follow();
+        throw;
     }
+    follow();
 }
 
 void Drawing::drawNext()
 {
-    if (!branches_.back().next) {
-        levels_.leave();
-        branches_.pop_back();
-        return;
-    }
+    if (!branches_.back().next)
+        return leave();
     ListedName const entry = std::move(*branches_.back().next);
     session_.attempt([&] { lookAhead(); });
     bool const isLast = !branches_.back().next.has_value();
@@ -175,19 +193,20 @@ void Drawing::drawFile(ListedName const& entry, bool isLast)
 
 void Drawing::drawFolder(ListedName const& entry, bool isLast)
 {
-    Place const place = levels_.innermost().folder().child(entry.name);
-    bool const isLink = kindOf(place) == Kind::SymlinkToFolder;
+    bool const isLink = tree_->kindOf(entry) == Kind::SymlinkToFolder;
     drawLine(isLast ? strokes_.lastBranch : strokes_.branch, entry.name,
              isLink ? " (a link to a folder, not followed)" : "");
     ++folders_;
-    if (!isLink)
-        enter(place, branches_.back().indentation + (isLast ? strokes_.space : strokes_.trunk));
+    if (isLink || !tree_->enter(entry))
+        return;
+    indentation_ += isLast ? strokes_.space : strokes_.trunk;
+    begin();
 }
 
 void Drawing::drawLine(char const* stroke, std::u16string const& name, char const* remark)
 {
     Output& output = session_.output();
-    output.write(branches_.back().indentation);
+    output.write(indentation_);
     output.write(stroke);
     output.write(printable(fl::filesystem::to_native_bytes(name)));
     output.write(remark);
