@@ -37,9 +37,10 @@ protected:
     }
 
     /// Copying it takes a while, even where holes are skipped: each byte has a place of its own on the disk.
-    void makeScattered(std::string const& name) const
+    void makeScattered(std::string const& name)
     {
         constexpr off_t pieces = 40000;
+        mostBytes = RLIM_INFINITY;
         std::filesystem::remove(folder / name);
         int const file = ::open((folder / name).c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600);
         for (off_t i = 0; i < pieces; ++i)
@@ -47,7 +48,8 @@ protected:
         ::close(file);
     }
 
-    /// Those that the process has open in a folder. They need not have a name.
+    /// Those that the process has open in a folder and has written much to, so that all else that it does besides is
+    /// done. They need not have a name, or it is a folder that has.
     int countScratchFiles(Process const& process, std::string const& name) const
     {
         namespace fs = std::filesystem;
@@ -58,8 +60,9 @@ protected:
         for (; !gone && file != fs::directory_iterator(); file.increment(gone)) {
             std::error_code closed;
             std::string const path = fs::read_symlink(file->path(), closed).native();
-            bool const isScratch = path.ends_with(".tmp.bak") || path.ends_with(" (deleted)");
-            count += path.starts_with(inside) && isScratch ? 1 : 0;
+            bool const isScratch = path.find(".tmp.bak") != std::string::npos || path.ends_with(" (deleted)");
+            if (path.starts_with(inside) && isScratch && fs::file_size(file->path(), closed) >= much && !closed)
+                ++count;
         }
         return count;
     }
@@ -90,6 +93,7 @@ protected:
         return process.finish();
     }
 
+    static constexpr std::uintmax_t much = 32U << 20U;
     rlim_t mostBytes = rlim_t{1} << 30U;
 };
 
@@ -177,7 +181,6 @@ TEST_F(Interrupt, LeavesASourceThatIsMovedByCopying)
     if (!mount("other", "256m"))
         GTEST_SKIP() << "file systems may not be mounted here";
     makeScattered("big");
-    mostBytes = RLIM_INFINITY;
     ProgramResult const result = interrupt({"mv", "big", "other"}, SIGINT, "other");
     EXPECT_EQ(result.status, 130);
     EXPECT_EQ(result.errors, "storage: mv: interrupted: 0 of 1 moved\n");
