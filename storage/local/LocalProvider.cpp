@@ -244,6 +244,15 @@ std::unique_ptr<ByteStream> LocalProvider::doOpenReadOnlyStream(StorageIRI const
     return openForReading(*root(), iri);
 }
 
+/// Without a location for the scratch file, which is all that a failure to create nothing could name.
+std::unique_ptr<TransactionalStream>
+LocalProvider::doOpenTransactionalStream(StorageIRI const& target, ByteStreamOpenOptions const& options) const
+{
+    if (options.create != ByteStreamCreate::Create)
+        return IConfigurableProvider::doOpenTransactionalStream(target, options);
+    return std::make_unique<LocalTransaction>(settings(), target, options);
+}
+
 std::unique_ptr<TransactionalStream>
 LocalProvider::doOpenTransactionalStreamAtScratchLocation(StorageIRI const& target, StorageIRI const& scratch,
                                                           ByteStreamOpenOptions const& options) const

@@ -70,6 +70,9 @@ protected:
                                                        provider::ByteStreamOpenOptions const& options) const override;
     std::unique_ptr<provider::ByteStream> doOpenReadOnlyStream(provider::StorageIRI const& iri) const override;
     std::unique_ptr<provider::TransactionalStream>
+    doOpenTransactionalStream(provider::StorageIRI const& target,
+                              provider::ByteStreamOpenOptions const& options) const override;
+    std::unique_ptr<provider::TransactionalStream>
     doOpenTransactionalStreamAtScratchLocation(provider::StorageIRI const& target, provider::StorageIRI const& scratch,
                                                provider::ByteStreamOpenOptions const& options) const override;
 

@@ -1,5 +1,6 @@
 #include <storage/local/detail/LocalTransaction.hpp>
 
+#include <fcntl.h>
 #include <utility>
 
 namespace foundation::storage::local::detail {
@@ -14,6 +15,13 @@ long LocalTransaction::Content::doRead(char* buffer, long count)
 {
     return isReadable_ ? DescriptorStream::doRead(buffer, count) : -1;
 }
+
+LocalTransaction::LocalTransaction(std::shared_ptr<Settings const> settings, StorageIRI const& target,
+                                   ByteStreamOpenOptions const& options)
+    : settings_(std::move(settings)),
+      file_(settings_->root, target, settings_->durability, openFlags(options) & ~(O_CREAT | O_TRUNC)),
+      content_(file_.file(), file_.targetPath(), options.access)
+{}
 
 LocalTransaction::LocalTransaction(std::shared_ptr<Settings const> settings, StorageIRI const& target,
                                    StorageIRI const& scratch, ByteStreamOpenOptions const& options)

@@ -14,6 +14,9 @@ namespace foundation::storage::local::detail {
 class LocalTransaction final : public provider::TransactionalStream
 {
 public:
+    /// With a new scratch file beside the target.
+    LocalTransaction(std::shared_ptr<Settings const> settings, provider::StorageIRI const& target,
+                     provider::ByteStreamOpenOptions const& options);
     LocalTransaction(std::shared_ptr<Settings const> settings, provider::StorageIRI const& target,
                      provider::StorageIRI const& scratch, provider::ByteStreamOpenOptions const& options);
     ~LocalTransaction() override;

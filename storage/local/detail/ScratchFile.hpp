@@ -57,6 +57,8 @@ public:
     /// Open until `commit` or `discard` succeeds.
     FileDescriptor const& file() const { return file_; }
 
+    std::string const& targetPath() const { return path_; }
+
     /// Puts the file in the target's place, as durably as was asked for.
     ///
     /// `Overwrite` and `Clobber` replace a file or a link; the new content has the permission bits of the old, those of
