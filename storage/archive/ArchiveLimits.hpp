@@ -22,7 +22,8 @@ struct ArchiveLimits
     /// The content of one entry, in bytes.
     std::uint64_t entryBytes = std::uint64_t{256} << 30;
 
-    /// Bytes of content for each byte in the archive. Deflate reaches 1030, for nothing but zeros.
+    /// Bytes of content for each byte in the archive. Deflate reaches 1030, for nothing but zeros. With 0 nothing is
+    /// let through but content of up to `bytesOfAnyRatio`.
     std::uint32_t ratio = 1000;
 
     /// Content up to this many bytes is let through, whatever its ratio.

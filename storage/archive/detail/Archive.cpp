@@ -29,7 +29,7 @@ std::shared_ptr<Archive const> openArchive(ArchiveFormat format, provider::Stora
 
 void requireRatio(ArchiveLimits const& limits, std::uint64_t size, std::uint64_t sizeInArchive)
 {
-    if (size > limits.bytesOfAnyRatio && size / limits.ratio > sizeInArchive)
+    if (size > limits.bytesOfAnyRatio && (limits.ratio == 0 || size / limits.ratio > sizeInArchive))
         throw Fault(Reason::RatioTooHigh);
 }
 

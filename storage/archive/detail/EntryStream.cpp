@@ -1,6 +1,8 @@
 #include <storage/archive/detail/EntryStream.hpp>
 
+#include <fl/i18n/convert.hpp>
 #include <fl/i18n/utf8.hpp>
+#include <storage/provider/ReasonInfo.hpp>
 
 #include <algorithm>
 #include <array>
@@ -27,7 +29,9 @@ ArchiveStreamFailure::ArchiveStreamFailure(std::string const& attempt, StorageIR
 ArchiveStreamFailure::ArchiveStreamFailure(std::string const& attempt, StorageIRI const& iri, Fault const& fault)
     : ByteStreamFailure(describeAttempt(attempt, iri) + ": " + describe(fault.reason),
                         std::make_error_code(std::io_errc::stream), fault.code)
-{}
+{
+    *this << ReasonInfo(fl::i18n::to_ustring(describe(fault.reason)));
+}
 
 core::except::IException* ArchiveStreamFailure::clone() const
 {
@@ -81,6 +85,7 @@ long EntryStream::doSeek(long offset, std::ios_base::seekdir direction)
     if (__builtin_add_overflow(origin, offset, &position) || position < 0)
         throw ArchiveStreamFailure("seek in", iri_, std::errc::invalid_argument);
     position_ = static_cast<std::uint64_t>(position);
+    failure_.reset();
     return position;
 }
 
@@ -89,10 +94,31 @@ void EntryStream::doClose()
     content_.reset();
 }
 
+/// A failure may come in the middle of moving on, so that nothing is read then before the content is begun anew.
 std::size_t EntryStream::readContent(char* buffer, std::size_t count)
 {
-    if (size_ == 0 && !std::exchange(isFinished_, true))
+    if (failure_)
+        throw Fault(*failure_);
+    try {
+        return readAtPosition(buffer, count);
+    } catch (Fault const& fault) {
+        failure_ = fault;
+        mustRestart_ = true;
+        throw;
+    } catch (...) {
+        mustRestart_ = true;
+        throw;
+    }
+}
+
+std::size_t EntryStream::readAtPosition(char* buffer, std::size_t count)
+{
+    if (mustRestart_)
+        restart();
+    if (size_ == 0 && !isFinished_) {
         content_->finish();
+        isFinished_ = true;
+    }
     if (position_ >= size_)
         return 0;
     goToPosition();
@@ -109,11 +135,16 @@ void EntryStream::goToPosition()
         contentPosition_ = position_;
         return;
     }
-    if (position_ < contentPosition_) {
-        content_->restart();
-        contentPosition_ = 0;
-    }
+    if (position_ < contentPosition_)
+        restart();
     skip(position_ - contentPosition_);
+}
+
+void EntryStream::restart()
+{
+    content_->restart();
+    contentPosition_ = 0;
+    mustRestart_ = false;
 }
 
 void EntryStream::skip(std::uint64_t count)
@@ -123,8 +154,7 @@ void EntryStream::skip(std::uint64_t count)
         count -= readOn(unwanted.data(), static_cast<std::size_t>(std::min<std::uint64_t>(count, unwanted.size())));
 }
 
-/// What comes next, and never nothing. A failure leaves the position of the content behind what was read, so that
-/// trying again fails again.
+/// What comes next, and never nothing.
 std::size_t EntryStream::readOn(char* buffer, std::size_t count)
 {
     std::uint64_t const left = size_ - contentPosition_;

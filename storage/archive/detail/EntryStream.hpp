@@ -8,6 +8,7 @@
 #include <storage/provider/StorageIRI.hpp>
 
 #include <memory>
+#include <optional>
 #include <string>
 #include <system_error>
 
@@ -27,7 +28,7 @@ public:
 /// Reads an entry at any place, by going over it again where the content can only be read forward.
 ///
 /// The last bytes are handed out when the content has turned out to be whole and right, not before. After a failure the
-/// stream fails for ever, unless it goes back.
+/// stream fails in the same way until it is moved by `seek`, which has it read the entry anew.
 class FOUNDATION_API EntryStream final : public provider::ByteStream
 {
 public:
@@ -45,6 +46,8 @@ protected:
 private:
     void requireOpen(char const* attempt, long count = 0) const;
     std::size_t readContent(char* buffer, std::size_t count);
+    std::size_t readAtPosition(char* buffer, std::size_t count);
+    void restart();
     void goToPosition();
     void skip(std::uint64_t count);
     std::size_t readOn(char* buffer, std::size_t count);
@@ -55,6 +58,8 @@ private:
     std::uint64_t position_ = 0;
     std::uint64_t contentPosition_ = 0;
     bool isFinished_ = false;
+    bool mustRestart_ = false; ///< nobody knows where the content stands
+    std::optional<Fault> failure_;
 };
 
 } // namespace foundation::storage::archive::detail

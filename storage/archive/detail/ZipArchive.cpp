@@ -3,8 +3,7 @@
 #include <storage/archive/detail/Fault.hpp>
 #include <storage/archive/detail/IndexBuilder.hpp>
 #include <storage/archive/detail/ZipContent.hpp>
-
-#include <fl/filesystem/native_name.hpp>
+#include <storage/archive/detail/zipText.hpp>
 
 #include <algorithm>
 #include <string>
@@ -46,7 +45,7 @@ std::size_t mostHandlesFor(std::uint64_t entries)
 
 EntryKind kindOf(ZipEntry const& entry)
 {
-    if (entry.name.ends_with(u'/'))
+    if (entry.name.ends_with(u'/') || (entry.isFolder && entry.size == 0))
         return EntryKind::Folder;
     switch (entry.unixMode & S_IFMT) {
     case S_IFLNK:
@@ -61,7 +60,8 @@ EntryKind kindOf(ZipEntry const& entry)
     }
 }
 
-/// The content of a link. One that cannot be read leads nowhere, and spoils nothing else.
+/// The content of a link. One that cannot be read, or is not as long as it is said to be, leads nowhere and spoils
+/// nothing else.
 std::string readTarget(ZipHandle& handle, std::uint64_t number, ZipEntry const& entry)
 {
     if (entry.isEncrypted || entry.size > longestTarget)
@@ -73,9 +73,9 @@ std::string readTarget(ZipHandle& handle, std::uint64_t number, ZipEntry const& 
         while (std::size_t const read = handle.read(file, target.data() + length, target.size() - length))
             length += read;
         target.resize(length);
-        return target;
+        return length == entry.size ? target : std::string();
     } catch (Fault const& fault) {
-        if (fault.reason == Reason::StoreFailed)
+        if (fault.reason == Reason::StoreFailed || fault.reason == Reason::Changed)
             throw;
         return {};
     }
@@ -87,7 +87,7 @@ void addEntry(IndexBuilder& builder, ZipHandle& handle, std::uint64_t number)
     std::u16string target;
     EntryKind const kind = kindOf(entry);
     if (kind == EntryKind::SymbolicLink)
-        target = fl::filesystem::from_native_bytes(readTarget(handle, number, entry));
+        target = fromZipText(readTarget(handle, number, entry));
     builder.add({.path = entry.name,
                  .kind = kind,
                  .size = entry.size,
@@ -132,7 +132,8 @@ std::unique_ptr<Content> ZipArchive::open(Index::Id file) const
         ZipEntry const entry = lease->handle().entry(numberOf(node));
         if (entry.isEncrypted)
             throw Fault(Reason::Encrypted);
-        requireWithinLimits(limits_, entry.size, entry.sizeInArchive);
+        // An entry may say that it takes more room in the archive than there is.
+        requireWithinLimits(limits_, entry.size, std::min(entry.sizeInArchive, source_->size()));
     }
     return std::make_unique<ZipContent>(std::move(lease), numberOf(node), isStored(node));
 }

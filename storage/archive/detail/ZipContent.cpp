@@ -23,12 +23,14 @@ ZipContent::~ZipContent()
 std::size_t ZipContent::read(char* buffer, std::size_t count)
 {
     std::lock_guard const lock(lease_->handle().mutex());
+    if (file_ == nullptr)
+        throw Fault(ArchiveException::Reason::Damaged);
     return lease_->handle().read(file_, buffer, count);
 }
 
 bool ZipContent::seek(std::uint64_t position)
 {
-    if (!isStored_)
+    if (!isStored_ || file_ == nullptr)
         return false;
     std::lock_guard const lock(lease_->handle().mutex());
     lease_->handle().seek(file_, position);

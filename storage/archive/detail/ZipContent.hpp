@@ -25,7 +25,7 @@ private:
     std::unique_ptr<ZipArchive::Lease> lease_;
     std::uint64_t const number_;
     bool const isStored_;
-    ZipHandle::File file_;
+    ZipHandle::File file_; ///< nothing after a failure to begin anew
 };
 
 } // namespace foundation::storage::archive::detail

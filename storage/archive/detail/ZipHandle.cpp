@@ -1,15 +1,11 @@
 #include <storage/archive/detail/ZipHandle.hpp>
 
 #include <storage/archive/detail/time.hpp>
+#include <storage/archive/detail/zipText.hpp>
 
-#include <fl/filesystem/native_name.hpp>
-#include <fl/i18n/utf8.hpp>
-
-#include <algorithm>
 #include <ctime>
-#include <exception>
 #include <new>
-#include <stdexcept>
+#include <sys/stat.h>
 #include <utility>
 #include <zip.h>
 
@@ -18,6 +14,8 @@ namespace foundation::storage::archive::detail {
 using Reason = ArchiveException::Reason;
 
 namespace {
+
+constexpr zip_uint32_t folderOfDos = 0x10;
 
 constexpr zip_int64_t supported =
     ZIP_SOURCE_SUPPORTS_SEEKABLE | ZIP_SOURCE_MAKE_COMMAND_BITMASK(ZIP_SOURCE_ACCEPT_EMPTY);
@@ -55,31 +53,6 @@ std::optional<std::int64_t> utcTime(::zip* archive, std::uint64_t number)
     for (unsigned i = 0; i != 4; ++i)
         seconds |= std::uint32_t{field[1 + i]} << (8 * i);
     return static_cast<std::int32_t>(seconds);
-}
-
-bool standsForBytes(char16_t unit)
-{
-    return unit >= 0xEF80 && unit <= 0xEFFF;
-}
-
-bool isUtf8(char const* text)
-{
-    try {
-        static_cast<void>(fl::i18n::from_utf8(text, fl::i18n::Malformed::Throw));
-        return true;
-    } catch (std::range_error const&) {
-        return false;
-    }
-}
-
-/// A name is taken for UTF-8, flagged or not, unless it cannot be; then it is in the characters of the first PCs.
-std::u16string nameOf(::zip* archive, std::uint64_t number, char const* bytes)
-{
-    std::u16string name = fl::filesystem::from_native_bytes(bytes);
-    if (std::none_of(name.begin(), name.end(), standsForBytes) || isUtf8(bytes))
-        return name;
-    char const* const converted = zip_get_name(archive, number, ZIP_FL_ENC_GUESS);
-    return converted == nullptr ? name : fl::filesystem::from_native_bytes(converted);
 }
 
 } // namespace
@@ -120,7 +93,7 @@ ZipEntry ZipHandle::entry(std::uint64_t number)
     if (zip_stat_index(zip_, number, ZIP_FL_ENC_RAW, &stat) != 0)
         throwFault(*zip_get_error(zip_));
     ZipEntry entry;
-    entry.name = nameOf(zip_, number, stat.name);
+    entry.name = fromZipText(stat.name);
     entry.size = stat.size;
     entry.sizeInArchive = stat.comp_size;
     entry.modified = toMicroseconds(utcTime(zip_, number).value_or(stat.mtime), 0);
@@ -130,6 +103,7 @@ ZipEntry ZipHandle::entry(std::uint64_t number)
     zip_uint32_t attributes = 0;
     if (zip_file_get_external_attributes(zip_, number, 0, &system, &attributes) == 0 && system == ZIP_OPSYS_UNIX)
         entry.unixMode = attributes >> 16;
+    entry.isFolder = entry.unixMode == 0 ? (attributes & folderOfDos) != 0 : S_ISDIR(entry.unixMode);
     return entry;
 }
 
@@ -167,8 +141,12 @@ void ZipHandle::throwFault(File const& file)
 
 void ZipHandle::throwFault(::zip_error const& error)
 {
-    if (failure_)
-        throw Fault(*std::exchange(failure_, std::nullopt));
+    if (failure_) {
+        lastFailure_ = std::exchange(failure_, std::nullopt);
+        throw Fault(*lastFailure_);
+    }
+    if (error.zip_err == ZIP_ER_READ && lastFailure_)
+        throw Fault(*lastFailure_);
     if (error.zip_err == ZIP_ER_MEMORY)
         throw std::bad_alloc();
     throw Fault(reasonOf(error.zip_err));
@@ -182,7 +160,7 @@ std::int64_t ZipHandle::serve(void* self, void* data, std::uint64_t length, int 
         return handle.answer(data, length, command);
     } catch (Fault const& fault) {
         handle.failure_ = fault;
-    } catch (std::exception const&) {
+    } catch (...) {
         handle.failure_ = Fault(Reason::StoreFailed);
     }
     zip_error_set(handle.error_.get(), ZIP_ER_READ, 0);

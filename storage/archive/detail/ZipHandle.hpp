@@ -27,6 +27,7 @@ struct ZipEntry
     std::uint32_t unixMode = 0; ///< 0 where the archive was not made by a system that has it
     bool isStored = false;
     bool isEncrypted = false;
+    bool isFolder = false; ///< as the attributes have it, whatever the name
 };
 
 /// An archive opened by libzip. One thread at a time may use it, and holds its lock meanwhile.
@@ -66,7 +67,8 @@ private:
 
     BufferedReader reader_;
     std::unique_ptr<::zip_error> error_;
-    std::optional<Fault> failure_; ///< of the source, which libzip knows as an error of reading alone
+    std::optional<Fault> failure_;     ///< of the source, which libzip knows as an error of reading alone
+    std::optional<Fault> lastFailure_; ///< which libzip may come back to
     ::zip* zip_ = nullptr;
     std::mutex mutex_;
 };
