@@ -9,7 +9,6 @@
 #include <cerrno>
 #include <cstdio>
 #include <exception>
-#include <new>
 #include <utility>
 
 namespace foundation::storage::archive::detail {
@@ -93,6 +92,7 @@ bool Cursor::next()
     if (result != ARCHIVE_OK && result != ARCHIVE_WARN)
         throwFault();
     ++count_;
+    contentRead_ = 0;
     return true;
 }
 
@@ -140,9 +140,13 @@ std::optional<std::uint64_t> Cursor::offsetOfPlainContent() const
 /// A warning about content is a checksum that does not match.
 std::size_t Cursor::read(char* buffer, std::size_t count)
 {
-    la_ssize_t const read = archive_read_data(archive_.get(), buffer, count);
+    la_ssize_t read = archive_read_data(archive_.get(), buffer, count);
+    // libarchive takes the beginning of a gap at the end for the end, and fills the gap when it is asked again.
+    if (read == 0 && contentRead_ < size())
+        read = archive_read_data(archive_.get(), buffer, count);
     if (read < 0)
         throwFault();
+    contentRead_ += static_cast<std::uint64_t>(read);
     return static_cast<std::size_t>(read);
 }
 
@@ -152,12 +156,11 @@ void Cursor::drain()
     }
 }
 
+/// Where libarchive is out of memory, the archive has promised more than anybody has.
 void Cursor::throwFault()
 {
     if (failure_)
         throw Fault(*std::exchange(failure_, std::nullopt));
-    if (archive_errno(archive_.get()) == ENOMEM)
-        throw std::bad_alloc();
     if (count_ > 0)
         throw Fault(Reason::Damaged);
     // libarchive must not be asked for more while it does not know the format.

@@ -65,6 +65,7 @@ private:
     LibArchivePtr archive_;
     ::archive_entry* entry_ = nullptr;
     std::uint64_t count_ = 0;
+    std::uint64_t contentRead_ = 0; ///< of the entry
     std::u16string path_;
     std::u16string target_;
 };

@@ -16,8 +16,10 @@ using Reason = ArchiveException::Reason;
 
 namespace {
 
-/// Each holds the state of a decompressor.
-constexpr std::size_t mostIdle = 8;
+/// Each holds the state of a decompressor, and that of a 7z or an image what it knows of all entries.
+constexpr std::size_t mostIdleOfFew = 8;
+constexpr std::size_t mostIdleOfMany = 2;
+constexpr std::size_t manyEntries = 20'000;
 
 /// The locator of an entry: the offset of content that stands in the archive as it is, else the number of the entry,
 /// shifted to make room for these.
@@ -126,17 +128,27 @@ std::unique_ptr<Cursor> CursorArchive::takeCursor(std::uint64_t number, std::uin
     return cursor;
 }
 
-/// The one that is nearest before the entry.
+std::size_t CursorArchive::mostIdle() const
+{
+    return index().size() > manyEntries ? mostIdleOfMany : mostIdleOfFew;
+}
+
+/// The one that is nearest before the entry. Where there is none, and one more will be made, the one that has waited
+/// longest makes room for it.
 std::unique_ptr<Cursor> CursorArchive::takeIdle(std::uint64_t number) const
 {
+    std::unique_ptr<Cursor> gone; // goes unlocked
     std::lock_guard const lock(mutex_);
     auto nearest = idle_.end();
     for (auto cursor = idle_.begin(); cursor != idle_.end(); ++cursor) {
         if ((*cursor)->count() <= number && (nearest == idle_.end() || (*cursor)->count() > (*nearest)->count()))
             nearest = cursor;
     }
-    if (nearest == idle_.end())
+    if (nearest == idle_.end()) {
+        if (idle_.size() >= mostIdle())
+            gone = takeOldest();
         return nullptr;
+    }
     std::unique_ptr<Cursor> cursor = std::move(*nearest);
     idle_.erase(nearest);
     return cursor;
@@ -148,10 +160,15 @@ void CursorArchive::giveBack(std::unique_ptr<Cursor> cursor) const
     std::unique_ptr<Cursor> gone;
     std::lock_guard const lock(mutex_);
     idle_.push_back(std::move(cursor));
-    if (idle_.size() <= mostIdle)
-        return;
-    gone = std::move(idle_.front());
+    if (idle_.size() > mostIdle())
+        gone = takeOldest();
+}
+
+std::unique_ptr<Cursor> CursorArchive::takeOldest() const
+{
+    std::unique_ptr<Cursor> oldest = std::move(idle_.front());
     idle_.erase(idle_.begin());
+    return oldest;
 }
 
 } // namespace foundation::storage::archive::detail

@@ -32,7 +32,9 @@ public:
 
 private:
     std::unique_ptr<Cursor> newCursor() const;
+    std::size_t mostIdle() const;
     std::unique_ptr<Cursor> takeIdle(std::uint64_t number) const;
+    std::unique_ptr<Cursor> takeOldest() const;
     void readIndex(std::int64_t modified);
     void readEntries(IndexBuilder& builder, Cursor& cursor, std::int64_t modified) const;
     std::unique_ptr<Content> openPlain(std::uint64_t offset, std::uint64_t size) const;

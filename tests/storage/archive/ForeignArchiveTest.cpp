@@ -10,6 +10,7 @@
 #include <gtest/gtest.h>
 
 #include <filesystem>
+#include <fstream>
 #include <map>
 #include <memory>
 #include <string>
@@ -51,6 +52,18 @@ std::string python(std::string const& method)
            "                z.write(path)\n";
 }
 
+std::string pythonTar(std::string const& mode, std::string const& format)
+{
+    return "import tarfile\n"
+           "with tarfile.open('../archive', '" +
+           mode + "', format=tarfile." + format + ") as t:\n    t.add('.')\n";
+}
+
+std::vector<std::string> gnuTar(std::string const& sparseVersion)
+{
+    return {"tar", "--format", "posix", "--sparse-version", sparseVersion, "-Scf", "../archive", "."};
+}
+
 std::vector<Packer> packers()
 {
     return {
@@ -66,16 +79,30 @@ std::vector<Packer> packers()
         {"bsdtar zstd", ArchiveFormat::Tar, {"bsdtar", "--zstd", "-cf", "../archive", "."}},
         {"tar gnu", ArchiveFormat::Tar, {"tar", "--format", "gnu", "-cf", "../archive", "."}},
         {"tar posix", ArchiveFormat::Tar, {"tar", "--format", "posix", "-cf", "../archive", "."}},
-        {"tar sparse", ArchiveFormat::Tar, {"tar", "--format", "posix", "-Scf", "../archive", "."}},
+        {"tar sparse 0.0", ArchiveFormat::Tar, gnuTar("0.0")},
+        {"tar sparse 0.1", ArchiveFormat::Tar, gnuTar("0.1")},
+        {"tar sparse 1.0", ArchiveFormat::Tar, gnuTar("1.0")},
         {"tar gnu sparse", ArchiveFormat::Tar, {"tar", "--format", "gnu", "-Scf", "../archive", "."}},
         {"tar gzip", ArchiveFormat::Tar, {"tar", "-czf", "../archive", "."}},
         {"tar bzip2", ArchiveFormat::Tar, {"tar", "-cjf", "../archive", "."}},
         {"tar xz", ArchiveFormat::Tar, {"tar", "-cJf", "../archive", "."}},
+        {"tar zstd", ArchiveFormat::Tar, {"tar", "--zstd", "-cf", "../archive", "."}},
+        {"tar lzma", ArchiveFormat::Tar, {"tar", "--lzma", "-cf", "../archive", "."}},
+        {"tar sparse xz", ArchiveFormat::Tar, {"tar", "-ScJf", "../archive", "."}},
+        {"python tar pax", ArchiveFormat::Tar, {"python3", "-c", pythonTar("w", "PAX_FORMAT")}},
+        {"python tar gnu gzip", ArchiveFormat::Tar, {"python3", "-c", pythonTar("w:gz", "GNU_FORMAT")}},
+        {"7z solid", ArchiveFormat::SevenZip, {"7z", "a", "-t7z", "-snl", "-ms=on", "../archive", "."}},
+        {"7z not solid", ArchiveFormat::SevenZip, {"7z", "a", "-t7z", "-snl", "-ms=off", "../archive", "."}},
+        {"7z PPMd", ArchiveFormat::SevenZip, {"7z", "a", "-t7z", "-snl", "-m0=PPMd", "../archive", "."}},
+        {"7z copy", ArchiveFormat::SevenZip, {"7z", "a", "-t7z", "-snl", "-m0=Copy", "../archive", "."}},
         {"7z 7z", ArchiveFormat::SevenZip, {"7z", "a", "-t7z", "-snl", "../archive", "."}},
         {"bsdtar 7zip", ArchiveFormat::SevenZip, {"bsdtar", "--format", "7zip", "-cf", "../archive", "."}},
         {"cpio", ArchiveFormat::Cpio, {"sh", "-c", "find . | cpio --quiet -o -H newc >../archive"}},
         {"cpio odc gzip", ArchiveFormat::Cpio, {"sh", "-c", "find . | cpio --quiet -o -H odc | gzip >../archive"}},
         {"bsdtar iso", ArchiveFormat::Iso, {"bsdtar", "--format", "iso9660", "-cf", "../archive", "."}},
+        {"cpio crc", ArchiveFormat::Cpio, {"sh", "-c", "find . | cpio --quiet -o -H crc >../archive"}},
+        {"xorriso", ArchiveFormat::Iso, {"xorriso", "-as", "mkisofs", "-quiet", "-R", "-o", "../archive", "."}},
+        {"genisoimage Joliet, too", ArchiveFormat::Iso, {"genisoimage", "-quiet", "-R", "-J", "-o", "../archive", "."}},
         {"genisoimage", ArchiveFormat::Iso, {"genisoimage", "-quiet", "-R", "-o", "../archive", "."}},
     };
 }
@@ -123,6 +150,13 @@ std::string text(std::size_t size)
     return numbers;
 }
 
+void makeFileBehindAHole(std::filesystem::path const& path)
+{
+    std::ofstream file(path);
+    file.seekp(700'000);
+    file << text(5000);
+}
+
 /// In a folder that is called "tree".
 void makeTree(TemporaryFolder const& folder)
 {
@@ -134,6 +168,10 @@ void makeTree(TemporaryFolder const& folder)
     folder.write("tree/docs/zeros", std::string(200'000, '\0'));
     folder.write("tree/docs/holes", "holes follow");
     std::filesystem::resize_file(folder / "tree/docs/holes", 1'000'000);
+    folder.write("tree/docs/only holes", "");
+    std::filesystem::resize_file(folder / "tree/docs/only holes", 1'000'000);
+    makeFileBehindAHole(folder / "tree/docs/behind a hole");
+    std::filesystem::create_hard_link(folder / "tree/docs/large", folder / "tree/docs/large, too");
     folder.write("tree/a/b/c/d/" + std::string(200, 'n'), "long name");
     folder.write("tree/\xE4\xB8\xAD\xE6\x96\x87 \xC3\xA9t\xC3\xA9", "names in UTF-8");
     std::filesystem::create_symlink("docs/large", folder / "tree/to file");

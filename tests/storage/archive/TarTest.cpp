@@ -6,7 +6,6 @@
 #include <tests/storage/archive/containers.hpp>
 #include <tests/storage/archive/zips.hpp>
 #include <tests/support/failureOf.hpp>
-#include <tests/support/inThreads.hpp>
 
 #include <gmock/gmock.h>
 
@@ -20,39 +19,10 @@ using Reason = ArchiveException::Reason;
 
 namespace {
 
-std::string numbers(std::size_t size)
-{
-    std::string text;
-    while (text.size() < size)
-        text += std::to_string(text.size()) + ' ';
-    text.resize(size);
-    return text;
-}
-
 StorageItem openTar(std::vector<Member> const& members, std::string const& compression = "",
                     ArchiveLimits const& limits = {})
 {
     return openRoot(ArchiveFormat::Tar, makeFile(makeArchive("pax", compression, members)), limits);
-}
-
-std::vector<Member> manyMembers()
-{
-    std::vector<Member> members;
-    for (int i = 0; i != 32; ++i)
-        members.push_back({.name = std::string("file") + static_cast<char>('A' + i),
-                           .content = numbers(10'000 + 1000 * static_cast<std::size_t>(i))});
-    return members;
-}
-
-template <typename Action>
-Reason reasonOf(Action const& action)
-{
-    try {
-        action();
-    } catch (ArchiveException const& error) {
-        return error.getReason();
-    }
-    throw std::logic_error("no ArchiveException");
 }
 
 TEST(Tar, IsReadInEveryCompression)
@@ -64,21 +34,6 @@ TEST(Tar, IsReadInEveryCompression)
         EXPECT_THAT(pathsBelow(root), ElementsAre(u"a", u"b", u"f/"));
         EXPECT_EQ(read(root, u"a"), numbers(100'000));
         EXPECT_EQ(read(root, u"b"), "");
-    }
-}
-
-TEST(Tar, StreamsSeekInBothDirections)
-{
-    for (char const* const compression : {"", "gzip"}) {
-        StorageItem const root =
-            openTar({{.name = "a", .content = numbers(1000)}, {.name = "b", .content = numbers(300'000)}}, compression);
-        auto const stream = StorageItem(root, u"b").openReadOnlyStream();
-        for (long const position : {200'000L, 10L, 299'990L, 0L, 150'000L, 150'020L}) {
-            EXPECT_EQ(stream->seek(position, std::ios_base::beg), position);
-            std::string bytes(10, '\0');
-            EXPECT_EQ(stream->read(bytes.data(), 10), 10);
-            EXPECT_EQ(bytes, numbers(300'000).substr(static_cast<std::size_t>(position), 10));
-        }
     }
 }
 
@@ -137,20 +92,6 @@ TEST(Tar, LiesInAZip)
     }
 }
 
-TEST(TarConcurrency, ThreadsReadEntriesOfOneArchiveAtOnce)
-{
-    for (char const* const compression : {"", "gzip"}) {
-        StorageItem const root = openTar(manyMembers(), compression);
-        inThreads(32, [&](int number) {
-            for (int i = 0; i != 8; ++i) {
-                int const wanted = (number + i * 5) % 32;
-                std::u16string const name = u"file" + std::u16string(1, static_cast<char16_t>(u'A' + wanted));
-                EXPECT_EQ(read(root, name), numbers(10'000 + 1000 * static_cast<std::size_t>(wanted)));
-            }
-        });
-    }
-}
-
 TEST(TarDamage, OfATruncatedArchiveWhatIsThereIsReadAndTheEndIsAFailure)
 {
     std::string const tar =
@@ -177,27 +118,6 @@ TEST(TarDamage, ATruncatedCompressedArchiveIsRefused)
             EXPECT_EQ(failureOf([&] { root.listAll(); }), failure(ErrorCode::IOError, file.getLocation()))
                 << compression << " without " << missing;
         }
-    }
-}
-
-TEST(TarDamage, AFlippedBitUnderAChecksumIsNeverReadAsContent)
-{
-    std::string const content = "some text, " + std::string(200, 'a');
-    for (char const* const compression : {"gzip", "bzip2", "xz"}) {
-        std::string const tar = makeArchive("ustar", compression, {{.name = "a", .content = content}});
-        int refused = 0;
-        for (std::size_t bit = 0; bit < tar.size() * 8; bit += 3) {
-            std::string damaged = tar;
-            damaged[bit / 8] = static_cast<char>(damaged[bit / 8] ^ (1 << bit % 8));
-            try {
-                EXPECT_EQ(read(openRoot(ArchiveFormat::Tar, makeFile(damaged)), u"a"), content) << compression << bit;
-            } catch (Exception const&) {
-                ++refused;
-            } catch (ByteStreamFailure const&) {
-                ++refused;
-            }
-        }
-        EXPECT_GT(refused, static_cast<int>(tar.size())) << compression;
     }
 }
 

@@ -73,4 +73,26 @@ std::string makeArchive(std::string const& format, std::string const& compressio
     return bytes;
 }
 
+std::vector<Kind> kindsOfArchives()
+{
+    return {{"tar", ArchiveFormat::Tar, "pax"},
+            {"tar.gz", ArchiveFormat::Tar, "pax", "gzip"},
+            {"tar.bz2", ArchiveFormat::Tar, "pax", "bzip2"},
+            {"tar.xz", ArchiveFormat::Tar, "pax", "xz"},
+            {"tar.zst", ArchiveFormat::Tar, "pax", "zstd"},
+            {"cpio", ArchiveFormat::Cpio, "newc"},
+            {"cpio.gz", ArchiveFormat::Cpio, "newc", "gzip"},
+            {"7z", ArchiveFormat::SevenZip, "7zip"},
+            {"iso", ArchiveFormat::Iso, "iso9660"}};
+}
+
+std::string numbers(std::size_t size)
+{
+    std::string text;
+    while (text.size() < size)
+        text += std::to_string(text.size()) + ' ';
+    text.resize(size);
+    return text;
+}
+
 } // namespace foundation::storage::archive
