@@ -20,10 +20,14 @@ using provider::StorageIRI;
 
 namespace {
 
-FileDescriptor openStart(StorageIRI const& folder)
+/// Several walks go on at once, beside what they are for.
+constexpr std::size_t maximumOpen = 24;
+
+FileDescriptor openStart(StorageIRI const& folder, StartLink link)
 {
+    int const flags = O_RDONLY | O_DIRECTORY | (link == StartLink::Refuse ? O_NOFOLLOW : 0);
     FileDescriptor opened;
-    if (int const error = Root().open(Root().pathOf(folder), O_RDONLY | O_DIRECTORY, opened))
+    if (int const error = Root().open(Root().pathOf(folder), flags, opened))
         throwError(error, folder);
     return opened;
 }
@@ -60,7 +64,9 @@ void describe(Status const& status, WalkedEntry& entry)
 class FolderWalk::Impl
 {
 public:
-    Impl(StorageIRI const& folder, WalkedDetail detail) : iri_(folder), chain_(openStart(folder)), detail_(detail) {}
+    Impl(StorageIRI const& folder, WalkedDetail detail, StartLink link)
+        : iri_(folder), chain_(openStart(folder, link), maximumOpen), detail_(detail)
+    {}
 
     std::optional<WalkedEntry> next();
     bool enter(std::string const& name);
@@ -170,7 +176,9 @@ void FolderWalk::Impl::leave()
     }
 }
 
-FolderWalk::FolderWalk(StorageIRI const& folder, WalkedDetail detail) : impl_(std::make_unique<Impl>(folder, detail)) {}
+FolderWalk::FolderWalk(StorageIRI const& folder, WalkedDetail detail, StartLink link)
+    : impl_(std::make_unique<Impl>(folder, detail, link))
+{}
 
 FolderWalk::~FolderWalk() = default;
 

@@ -29,6 +29,13 @@ enum class WalkedDetail
     Attributes,
 };
 
+/// What becomes of a link where a walk is to begin.
+enum class StartLink
+{
+    Follow,
+    Refuse,
+};
+
 /// A walk through a local folder and what lies below it, which its user leads.
 ///
 /// Each folder is entered by its name in the one above, and never by a link: whatever is renamed, swapped or linked
@@ -41,8 +48,8 @@ enum class WalkedDetail
 class FOUNDATION_API FolderWalk
 {
 public:
-    /// Begins in a folder; a link to one is followed.
-    FolderWalk(provider::StorageIRI const& folder, WalkedDetail detail);
+    /// Begins in a folder.
+    FolderWalk(provider::StorageIRI const& folder, WalkedDetail detail, StartLink link = StartLink::Follow);
     ~FolderWalk();
     FolderWalk(FolderWalk const&) = delete;
     FolderWalk& operator=(FolderWalk const&) = delete;

@@ -69,7 +69,10 @@ public:
     void fail(Place const& source, Failure const& failure);
     void fail(Failure const& failure);
 
-    /// Waits for all copies. Answers whether all that was asked for since the last call was done. Throws `Interrupted`.
+    /// Waits for all copies that were asked for. Throws `Interrupted`.
+    void settle() { workers_.finish(); }
+
+    /// The same. Answers whether all that was asked for since the last call was done. Throws `Interrupted`.
     bool finish();
 
     /// Stops the copies, tells of those that were done, and answers what to say of them: "120 of 400 files copied, 1.2

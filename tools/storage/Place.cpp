@@ -28,6 +28,10 @@ bool isIRI(std::string const& argument)
 
 Place::Place(provider::StorageItem item, std::string text) : item_(std::move(item)), text_(std::move(text)) {}
 
+Place::Place(provider::StorageItem item, std::string text, std::shared_ptr<void const> hold)
+    : item_(std::move(item)), text_(std::move(text)), hold_(std::move(hold))
+{}
+
 bool Place::saysFolder() const
 {
     return text_.ends_with('/');
@@ -37,7 +41,7 @@ Place Place::child(std::u16string const& name) const
 {
     provider::StorageItem item(item_, name);
     std::string text = childText(text_, name, item);
-    return Place(std::move(item), std::move(text));
+    return Place(std::move(item), std::move(text), hold_);
 }
 
 } // namespace foundation::storage::tool

@@ -80,7 +80,27 @@ std::string explain(provider::Exception const& error, std::string const& argumen
     return tool::explain(error);
 }
 
+/// Of a place that is known by its text alone.
+StorageIRI locationOfText(std::string const& text)
+{
+    return isIRI(text) ? StorageIRI(textOfIRI(text)) : locationOfPath(text);
+}
+
 } // namespace
+
+provider::StorageIRI shownLocation(Place const& place)
+{
+    StorageIRI const location = place.hold() ? locationOfText(place.text()) : place.item().getLocation();
+    std::u16string text = location.toString();
+    if (!text.starts_with(u"file:"))
+        return location;
+    std::size_t const length = text.size();
+    for (std::size_t dot = text.find(u"/./"); dot != std::u16string::npos; dot = text.find(u"/./"))
+        text.erase(dot, 2);
+    if (text.ends_with(u"/."))
+        text.resize(text.size() - (text == u"file:///." ? 1 : 2));
+    return text.size() == length ? location : StorageIRI(text);
+}
 
 Stores::Stores()
 {

@@ -9,6 +9,9 @@
 
 namespace foundation::storage::tool {
 
+/// Where a place is for whoever reads it, without "." on the way where the store is a local one.
+provider::StorageIRI shownLocation(Place const& place);
+
 /// The stores that the tool can reach: those that are built in. They do not wait for disks until they are told to.
 class Stores
 {

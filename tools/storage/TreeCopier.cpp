@@ -34,59 +34,142 @@ bool makeFolder(Place const& target)
 
 } // namespace
 
-TreeCopier::TreeCopier(CopyRun& run) : run_(run) {}
-
 void TreeCopier::copy(Place const& source, Place const& target)
 {
-    for (enter(source, target); !levels_.empty(); step())
+    if (!begin(source, target))
+        return;
+    while (step())
         checkInterrupt();
-}
-
-/// A listing that fails is through.
-void TreeCopier::step()
-{
-    FolderLevel& level = levels_.innermost();
-    try {
-        if (level.hasNext())
-            return copyEntry(level, level.next());
-    } catch (Failure const& failure) {
-        run_.fail(level.folder(), level.counterpart(), failure);
-        return;
-    }
-    run_.finishFolder(level.folder(), level.counterpart(), level.isFresh);
-    levels_.leave();
-    run_.changeFolder();
-}
-
-/// What a listing calls a folder may be a link to one. What somebody is still writing is nobody else's.
-void TreeCopier::copyEntry(FolderLevel const& level, ListedName const& entry)
-{
-    if (entry.isFile && isScratchName(entry.name))
-        return;
-    Place source = level.folder().child(entry.name);
-    Place target = level.counterpart().child(entry.name);
-    if (entry.isFile)
-        run_.copyFile(std::move(source), std::move(target), level.isFresh ? TargetState::Free : TargetState::Unknown);
-    else
-        enter(source, target);
+    source_.reset();
+    target_.reset();
 }
 
 /// Opens the source before the target is made, so that nothing is left of a folder that cannot be read.
-void TreeCopier::enter(Place const& source, Place const& target)
+bool TreeCopier::begin(Place const& source, Place const& target)
 {
-    std::size_t const depth = levels_.depth();
     try {
         requireCopyable(source);
-        levels_.enter(source, target);
-        levels_.innermost().isFresh = makeFolder(target);
-        if (levels_.innermost().isFresh)
-            beginFolder(source, target);
-        run_.changeFolder();
+        source_ = openTree(stores_, source, Listing::NamesOnly, local::StartLink::Refuse);
+        bool const isFresh = makeFolder(target);
+        target_ = openTree(stores_, target, Listing::NamesOnly, local::StartLink::Refuse);
+        areFresh_.clear();
+        arrive(isFresh);
+        return true;
     } catch (Failure const& failure) {
-        if (levels_.depth() > depth)
-            levels_.leave();
         run_.fail(source, target, failure);
+        return false;
     }
+}
+
+void TreeCopier::arrive(bool isFresh)
+{
+    areFresh_.push_back(isFresh);
+    if (isFresh)
+        beginFolder(source_->workingPlace(), target_->workingPlace());
+    run_.changeFolder();
+}
+
+/// Answers whether there is more to do. A listing that fails is through.
+bool TreeCopier::step()
+{
+    std::optional<ListedName> entry;
+    try {
+        entry = source_->next();
+    } catch (Failure const& failure) {
+        fail(failure);
+        return true;
+    }
+    if (entry) {
+        copyEntry(*entry);
+        return true;
+    }
+    bool const isDone = source_->depth() == 0;
+    leave();
+    return !isDone;
+}
+
+void TreeCopier::fail(Failure const& failure)
+{
+    run_.fail(source_->place(), target_->place(), failure);
+}
+
+/// What a listing calls a folder may be a link to one. What somebody is still writing is nobody else's.
+void TreeCopier::copyEntry(ListedName const& entry)
+{
+    if (entry.isFile && isScratchName(entry.name))
+        return;
+    Place source = source_->workingPlaceOf(entry);
+    Place target = target_->workingPlaceOf(entry);
+    if (!entry.isFile)
+        return enter(entry, source, target);
+    keep(source);
+    keep(target);
+    run_.copyFile(std::move(source), std::move(target), areFresh_.back() ? TargetState::Free : TargetState::Unknown);
+}
+
+void TreeCopier::enter(ListedName const& entry, Place const& source, Place const& target)
+{
+    std::size_t const depth = source_->depth();
+    try {
+        requireCopyable(source);
+        if (!source_->enter(entry))
+            throw Failure{source.text(), "became something else meanwhile"};
+        bool const isFresh = makeFolder(target);
+        if (!target_->enter(entry))
+            throw Failure{target.text(), "became something else meanwhile"};
+        arrive(isFresh);
+    } catch (Failure const& failure) {
+        run_.fail(source, target, failure);
+        if (source_->depth() > depth)
+            leaveBoth();
+    }
+}
+
+void TreeCopier::leave()
+{
+    try {
+        Place const source = source_->workingPlace();
+        Place const target = target_->workingPlace();
+        keep(source);
+        keep(target);
+        run_.finishFolder(source, target, areFresh_.back());
+    } catch (Failure const& failure) {
+        fail(failure);
+    }
+    if (source_->depth() > 0)
+        leaveBoth();
+}
+
+/// Goes back at both ends, further at both where one of them has to, because folders were moved away.
+void TreeCopier::leaveBoth()
+{
+    std::size_t depth = source_->depth() - 1;
+    for (TreeCursor* const end : {source_.get(), target_.get(), source_.get()}) {
+        while (end->depth() > depth) {
+            try {
+                end->leave();
+            } catch (Failure const& failure) {
+                fail(failure);
+            }
+        }
+        depth = end->depth();
+    }
+    areFresh_.resize(depth + 1);
+    run_.changeFolder();
+}
+
+/// Each folder that a copy may need takes a descriptor until that is done.
+void TreeCopier::keep(Place const& place)
+{
+    constexpr std::size_t maximum = 32;
+    if (!place.hold() || (!held_.empty() && held_.back().lock() == place.hold()) ||
+        (held_.size() > 1 && held_[held_.size() - 2].lock() == place.hold()))
+        return;
+    if (held_.size() >= maximum)
+        std::erase_if(held_, [](std::weak_ptr<void const> const& folder) { return folder.expired(); });
+    if (held_.size() >= maximum)
+        run_.settle();
+    held_.push_back(place.hold());
 }
 
 } // namespace foundation::storage::tool

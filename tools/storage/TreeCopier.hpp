@@ -1,7 +1,10 @@
 #pragma once
 
 #include <tools/storage/CopyRun.hpp>
-#include <tools/storage/FolderStack.hpp>
+#include <tools/storage/TreeCursor.hpp>
+
+#include <memory>
+#include <vector>
 
 namespace foundation::storage::tool {
 
@@ -9,22 +12,34 @@ namespace foundation::storage::tool {
 /// the files that they hold.
 ///
 /// Links to folders, broken links and special files are complained about and passed over, and links are never followed
-/// below the target either. An existing folder is merged with.
+/// below the target either. An existing folder is merged with. Through local folders it goes as `TreeCursor` does, at
+/// both ends, and files are copied from and to the very folders that it stood in.
 class TreeCopier
 {
 public:
-    explicit TreeCopier(CopyRun& run);
+    TreeCopier(Stores const& stores, CopyRun& run) : stores_(stores), run_(run) {}
 
     /// Has complained about what cannot be copied, and has asked for the rest, when it returns.
     void copy(Place const& source, Place const& target);
 
 private:
-    void step();
-    void copyEntry(FolderLevel const& level, ListedName const& entry);
-    void enter(Place const& source, Place const& target);
+    bool begin(Place const& source, Place const& target);
+    bool step();
+    void copyEntry(ListedName const& entry);
+    void enter(ListedName const& entry, Place const& source, Place const& target);
+    void arrive(bool isFresh);
+    void leave();
+    void leaveBoth();
+    void fail(Failure const& failure);
+    void keep(Place const& place);
 
+    Stores const& stores_;
     CopyRun& run_;
-    FolderStack levels_;
+    std::unique_ptr<TreeCursor> source_;
+    std::unique_ptr<TreeCursor> target_;
+    std::vector<bool>
+        areFresh_; ///< of the folders on the way: whether it was made at the target, and held nothing then
+    std::vector<std::weak_ptr<void const>> held_; ///< folders that copies not yet done may need
 };
 
 } // namespace foundation::storage::tool

@@ -1,12 +1,12 @@
 #include <tools/storage/TreeCursor.hpp>
 
 #include <fl/filesystem/native_name.hpp>
-#include <storage/local/FolderWalk.hpp>
 #include <storage/provider/Exception.hpp>
 #include <tools/storage/describe.hpp>
 #include <tools/storage/entries.hpp>
 #include <tools/storage/physicalPath.hpp>
 
+#include <unistd.h>
 #include <utility>
 #include <vector>
 
@@ -39,6 +39,7 @@ public:
     std::string textOf(ListedName const& listed) const override { return placeOf(listed).text(); }
     Place place() const override { return levels_.innermost().folder(); }
     Place placeOf(ListedName const& listed) const override { return levels_.innermost().folder().child(listed.name); }
+    Place workingPlace() override { return place(); }
     Place workingPlaceOf(ListedName const& listed) override { return placeOf(listed); }
 
 private:
@@ -49,9 +50,9 @@ private:
 class LocalCursor final : public TreeCursor
 {
 public:
-    LocalCursor(Stores const& stores, Place const& folder, Listing listing)
+    LocalCursor(Stores const& stores, Place const& folder, Listing listing, local::StartLink link)
         : stores_(stores), root_(folder), walk_(at(folder, [&] {
-              return std::make_unique<local::FolderWalk>(folder.item().getLocation(), of(listing));
+              return std::make_unique<local::FolderWalk>(folder.item().getLocation(), of(listing), link);
           }))
     {}
 
@@ -96,17 +97,36 @@ public:
     Place place() const override { return path_.empty() ? root_ : root_.child(path_); }
     Place placeOf(ListedName const& listed) const override { return root_.child(pathOf(listed)); }
 
+    Place workingPlace() override
+    {
+        Held const& held = hold();
+        return Place(held.item, text(), held.folder);
+    }
+
     Place workingPlaceOf(ListedName const& listed) override
     {
-        attempt([&] {
-            if (!held_)
-                held_.emplace(walk_->hold());
-        });
-        Place const folder(stores_.itemAt(held_->location()), text());
-        return Place(provider::StorageItem(folder.item(), listed.name), textOf(listed));
+        Held const& held = hold();
+        return Place(provider::StorageItem(held.item, listed.name), textOf(listed), held.folder);
     }
 
 private:
+    struct Held
+    {
+        std::shared_ptr<local::HeldFolder const> folder;
+        provider::StorageItem item;
+    };
+
+    Held const& hold()
+    {
+        attempt([&] {
+            if (held_)
+                return;
+            auto const folder = std::make_shared<local::HeldFolder const>(walk_->hold());
+            held_.emplace(Held{folder, stores_.itemAt(folder->location())});
+        });
+        return *held_;
+    }
+
     static local::WalkedDetail of(Listing listing)
     {
         return listing == Listing::NamesOnly ? local::WalkedDetail::Names : local::WalkedDetail::Attributes;
@@ -161,15 +181,21 @@ private:
     std::unique_ptr<local::FolderWalk> walk_;
     std::u16string path_;           ///< from the root to the innermost folder
     std::vector<std::size_t> ends_; ///< how long that was above
-    std::optional<local::HeldFolder> held_;
+    std::optional<Held> held_;
 };
+
+bool canHoldFolders()
+{
+    static bool const answer = ::access("/proc/self/fd", X_OK) == 0;
+    return answer;
+}
 
 } // namespace
 
-std::unique_ptr<TreeCursor> openTree(Stores const& stores, Place const& folder, Listing listing)
+std::unique_ptr<TreeCursor> openTree(Stores const& stores, Place const& folder, Listing listing, local::StartLink link)
 {
-    if (isLocal(folder))
-        return std::make_unique<LocalCursor>(stores, folder, listing);
+    if (isLocal(folder) && canHoldFolders())
+        return std::make_unique<LocalCursor>(stores, folder, listing, link);
     return std::make_unique<StoreCursor>(folder, listing);
 }
 

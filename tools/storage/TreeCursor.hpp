@@ -1,5 +1,6 @@
 #pragma once
 
+#include <storage/local/FolderWalk.hpp>
 #include <tools/storage/FolderStack.hpp>
 #include <tools/storage/Place.hpp>
 #include <tools/storage/Stores.hpp>
@@ -43,12 +44,14 @@ public:
     virtual Place place() const = 0;
     virtual Place placeOf(ListedName const& listed) const = 0;
 
-    /// An entry of the innermost folder for working on it: its location leads nowhere else, whatever is swapped, and is
-    /// good until the walk goes on from the folder.
+    /// The innermost folder, and an entry of it, for working on them: whatever is swapped, their locations lead nowhere
+    /// else.
+    virtual Place workingPlace() = 0;
     virtual Place workingPlaceOf(ListedName const& listed) = 0;
 };
 
-/// Throws `Failure` when the folder cannot be listed.
-std::unique_ptr<TreeCursor> openTree(Stores const& stores, Place const& folder, Listing listing);
+/// A local link to a folder is followed or refused as it is told to. Throws `Failure` when the folder cannot be listed.
+std::unique_ptr<TreeCursor> openTree(Stores const& stores, Place const& folder, Listing listing,
+                                     local::StartLink link = local::StartLink::Follow);
 
 } // namespace foundation::storage::tool

@@ -58,18 +58,16 @@ public:
         if (!isScratchName(listed.name))
             return options_.isRecursive && kind == Kind::RegularFolder;
         Place const place = tree.workingPlaceOf(listed);
-        at(place, [&] { cleanEntry(place, kind, tree.placeOf(listed)); });
+        at(place, [&] { cleanEntry(place, kind); });
         return false;
     }
 
 private:
-    void cleanEntry(Place const& place, Kind kind, Place const& shown)
+    void cleanEntry(Place const& place, Kind kind)
     {
-        std::optional<Entry> entry = described(place, kind);
-        if (!entry || stateAfterCleaning(place) != ScratchFileState::Abandoned)
-            return;
-        entry->location = shown.item().getLocation();
-        tell(shown, *entry);
+        std::optional<Entry> const entry = described(place, kind);
+        if (entry && stateAfterCleaning(place) == ScratchFileState::Abandoned)
+            tell(place, *entry);
     }
 
     /// Before it is removed.

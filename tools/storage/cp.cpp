@@ -43,7 +43,7 @@ public:
     Copy(Session& session, Options const& options, Place target)
         : session_(session),
           run_(session, runOptions(options)),
-          trees_(run_),
+          trees_(session.stores(), run_),
           target_(std::move(target), options.paths.size() - 1),
           isRecursive_(options.isRecursive)
     {}

@@ -3,6 +3,7 @@
 #include <fl/filesystem/native_name.hpp>
 #include <fl/i18n/utf8.hpp>
 #include <nlohmann/json.hpp>
+#include <tools/storage/Stores.hpp>
 #include <tools/storage/describe.hpp>
 #include <tools/storage/format.hpp>
 
@@ -33,7 +34,7 @@ nlohmann::ordered_json toJSON(std::vector<Attribute> const& attributes)
 
 Entry bareEntry(Place const& place, Kind kind)
 {
-    return {place.item().getName(), place.item().getLocation(), kind, {}, {}, {}, {}, {}, {}};
+    return {place.item().getName(), shownLocation(place), kind, {}, {}, {}, {}, {}, {}};
 }
 
 Entry describeEntry(Place const& place)

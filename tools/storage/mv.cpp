@@ -138,7 +138,7 @@ Move::Move(Session& session, Options const& options, Place target)
       replace_(options.replaces ? Replace::Files : Replace::Never),
       isSynced_(options.transfers.isSynced),
       run_(session, runOptions(options, replace_)),
-      trees_(run_),
+      trees_(session.stores(), run_),
       target_(std::move(target), options.paths.size() - 1),
       telling_(tellingOf(options.transfers))
 {}

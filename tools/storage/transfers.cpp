@@ -2,6 +2,7 @@
 
 #include <fl/i18n/utf8.hpp>
 #include <nlohmann/json.hpp>
+#include <tools/storage/Stores.hpp>
 #include <tools/storage/printable.hpp>
 
 namespace foundation::storage::tool {
@@ -10,7 +11,7 @@ namespace {
 
 std::string locationOf(Place const& place)
 {
-    return fl::i18n::to_utf8(place.item().getLocation().toString(), fl::i18n::Malformed::Replace);
+    return fl::i18n::to_utf8(shownLocation(place).toString(), fl::i18n::Malformed::Replace);
 }
 
 std::string errorOf(Failure const& failure)

@@ -49,7 +49,7 @@ int goTo(off_t position, FileDescriptor const& folder)
 
 } // namespace
 
-FolderChain::FolderChain(FileDescriptor outermost)
+FolderChain::FolderChain(FileDescriptor outermost, std::size_t maximum) : maximum_(maximum)
 {
     levels_.push_back({{}, std::move(outermost)});
 }
@@ -64,7 +64,7 @@ std::string FolderChain::path(std::size_t depth) const
 
 int FolderChain::enter(char const* name, Mounts mounts)
 {
-    if (levels_.size() - firstOpen_ >= maximumOpen) {
+    if (levels_.size() - firstOpen_ >= maximum_) {
         if (int const error = closeOne())
             return error;
     }

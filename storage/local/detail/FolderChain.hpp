@@ -34,7 +34,7 @@ public:
     static constexpr std::size_t maximumOpen = 64;
 
     /// Nothing is read of the outermost folder unless it was opened for reading.
-    explicit FolderChain(FileDescriptor outermost);
+    explicit FolderChain(FileDescriptor outermost, std::size_t maximum = maximumOpen);
 
     /// How many folders have been entered and not left.
     std::size_t depth() const { return levels_.size() - 1; }
@@ -98,6 +98,7 @@ private:
     int reopenInnermost(int below);
     std::size_t findAgain(FileDescriptor& deepest) const;
 
+    std::size_t maximum_;
     std::vector<Level> levels_;
     std::size_t firstOpen_ = 1; ///< this level and all below it are open, those between it and the outermost are not
     NameBuffer names_;          ///< of the innermost folder

@@ -61,7 +61,7 @@ protected:
     {
         options.jobs = 4;
         CopyRun run(session, options);
-        TreeCopier(run).copy(source, target.child(u"t"));
+        TreeCopier(session.stores(), run).copy(source, target.child(u"t"));
         return run.finish();
     }
 
@@ -110,7 +110,7 @@ TEST_F(CopyRunConcurrency, TellsWhatWasDoneWhenItIsStopped)
     CopyRunOptions options;
     options.jobs = 4;
     CopyRun run(session, options);
-    TreeCopier(run).copy(source, target.child(u"t"));
+    TreeCopier(session.stores(), run).copy(source, target.child(u"t"));
     std::string const done = run.stop(true);
     EXPECT_NE(done.find(" of 2000 files copied, "), std::string::npos) << done;
 }

@@ -1,5 +1,7 @@
 #include <tests/tools/storage/ToolTest.hpp>
 
+#include <nlohmann/json.hpp>
+
 namespace {
 
 using CpFolder = ToolTest;
@@ -214,6 +216,26 @@ TEST_F(CpFolder, GoesDeeperThanListingsCanBeOpen)
     makeDeepFolder("a");
     EXPECT_EQ(runWithFewDescriptors({"cp", "-r", "a", "t"}).status, 0);
     EXPECT_TRUE(areEqual("a", "t"));
+}
+
+TEST_F(CpFolder, LeavesOutScratchFiles)
+{
+    constexpr char const* scratch = "7e9f4b5e-0d6c-4a57-8f2e-1b9d3c5a7e90.tmp.bak";
+    makeFolder("a/b");
+    folder.write("a/b/f", "1");
+    folder.write(std::string("a/b/") + scratch, "2");
+    runWell({"cp", "-r", "a", "t"});
+    EXPECT_TRUE(exists("t/b/f"));
+    EXPECT_EQ(countEntries("t/b"), 1U);
+}
+
+TEST_F(CpFolder, TellsOfFilesByTheLocationsThatUsersKnow)
+{
+    makeFolder("a/b");
+    folder.write("a/b/f", "1");
+    auto const told = nlohmann::json::parse(runWell({"cp", "-r", "--json", "./a/.", "t"}));
+    EXPECT_EQ(told.at("source"), "file://" + (folder / "a/b/f").string());
+    EXPECT_EQ(told.at("target"), "file://" + (folder / "t/b/f").string());
 }
 
 } // namespace

@@ -127,6 +127,43 @@ TEST_F(SwapConcurrency, LeadsNoSumOutside)
     expectNeverWritten({"du", "-s", "tree"}, "7654", "          18  ");
 }
 
+TEST_F(SwapConcurrency, LeadsNoCopyFromOutside)
+{
+    expectSwappingToMatter();
+    Swapper const swapper = swap();
+    int met = 0;
+    auto const end = Clock::now() + duration;
+    while (Clock::now() < end || met == 0) {
+        ASSERT_LT(Clock::now(), end + patience);
+        run({"cp", "-r", "tree", "copy"});
+        if (exists("copy/swapped/who")) {
+            ++met;
+            ASSERT_EQ(folder.read("copy/swapped/who"), "within");
+        }
+        ASSERT_FALSE(exists("copy/swapped/known outside"));
+        ASSERT_FALSE(exists("copy/swapped/deep/known outside"));
+        fs::remove_all(folder / "copy");
+    }
+}
+
+TEST_F(SwapConcurrency, LeadsNoCopyToTheOutside)
+{
+    makeFolder("source/swapped/deep");
+    for (char const* const name : {"swapped/new", "swapped/deep/new"})
+        folder.write(std::string("source/") + name, "new");
+    expectSwappingToMatter();
+    std::size_t const outside = countEntries("outside");
+    Swapper const swapper = swap();
+    int met = 0;
+    auto const end = Clock::now() + duration;
+    while (Clock::now() < end || met == 0) {
+        ASSERT_LT(Clock::now(), end + patience);
+        met += run({"cp", "-rp", "--replace", "source/.", "tree"}).status == 0 ? 1 : 0;
+        ASSERT_EQ(countEntries("outside"), outside);
+        ASSERT_EQ(countEntries("outside/deep"), 1U);
+    }
+}
+
 TEST_F(SwapConcurrency, LeadsNoCleaningOutside)
 {
     expectSwappingToMatter();
