@@ -90,6 +90,7 @@ private:
     bool isStopped() const { return interrupt_ && interrupt_() != InterruptSignal::Continue; }
 
     bool share() const;
+    bool hasHole() const;
 
     /// Both ends stand where the copy goes on. What is left of `rest` lies beyond the end of the source.
     Ending copyRange(off_t& rest);
@@ -138,13 +139,22 @@ bool ContentCopy::share() const
     return errorOf([&] { return systemCalls().ficlone(target_.get(), source_.get()); }) == 0;
 }
 
+/// The number of blocks does not tell where some lie beyond the end of the file.
+bool ContentCopy::hasHole() const
+{
+    off_t const hole = systemCalls().lseek(source_.get(), 0, SEEK_HOLE);
+    if (hole == -1)
+        return false;
+    return hole < size_ || systemCalls().lseek(source_.get(), 0, SEEK_SET) == -1;
+}
+
 CopyResult ContentCopy::copyLarge(bool isSparse)
 {
     if (isStopped())
         return {CopyOutcome::Aborted};
     if (share())
         return {};
-    if (isSparse)
+    if (isSparse || hasHole())
         return copySparse();
     off_t rest = size_;
     return copyRange(rest).value_or(CopyResult());

@@ -40,13 +40,31 @@ struct Move
     Located target;
 };
 
+/// Whether a file has to stay in its folder, although this user may write there: it is fixed, or of somebody else in a
+/// folder of somebody else that is sticky.
+bool hasToStay(Move const& move)
+{
+    constexpr auto fixed = STATX_ATTR_IMMUTABLE | STATX_ATTR_APPEND;
+    Located parent;
+    Status folder;
+    Status file;
+    if (move.root.locate(parentOf(move.fromPath), parent) != 0 ||
+        getFullStatus(parent.at(), Links::Follow, folder) != 0 ||
+        getFullStatus(move.source.at(), Links::Keep, file) != 0)
+        return false;
+    uid_t const user = ::geteuid();
+    bool const isOurs = user == 0 || file.stx_uid == user || folder.stx_uid == user;
+    return (file.stx_attributes & fixed) != 0 || ((folder.stx_mode & S_ISVTX) != 0 && !isOurs);
+}
+
 /// The end of a move that is to blame for an error that does not say.
 StorageIRI const& culprit(int error, Move const& move)
 {
     bool const forbidden = error == EACCES || error == EPERM;
     Status status;
-    bool const atSource = forbidden ? move.root.checkAccess(parentOf(move.fromPath), W_OK | X_OK) != 0
-                                    : meansMissing(getStatus(move.source.at(), Links::Keep, status));
+    bool const atSource = forbidden
+                              ? move.root.checkAccess(parentOf(move.fromPath), W_OK | X_OK) != 0 || hasToStay(move)
+                              : meansMissing(getStatus(move.source.at(), Links::Keep, status));
     return atSource ? move.from : move.to;
 }
 
@@ -80,10 +98,14 @@ bool lacksNoReplace(int error)
 }
 
 /// For a file system without `RENAME_NOREPLACE`: a second name is never made over an existing one either.
-int moveFileBySecondName(At const& from, At const& to)
+int addSecondName(At const& from, At const& to)
 {
-    if (int const error = addName(from, to))
-        return error == EPERM ? EOPNOTSUPP : error;
+    int const error = addName(from, to);
+    return error == EPERM ? EOPNOTSUPP : error;
+}
+
+int removeFirstName(At const& from, At const& to)
+{
     int const error = removeName(from);
     if (error != 0)
         removeName(to);
@@ -164,6 +186,20 @@ bool isFolderAtTarget(Status const& target, Move const& move)
     return error == 0 && isFolder(followed);
 }
 
+int moveFilePreserving(Move const& move)
+{
+    At const from = move.source.at();
+    At const to = move.target.at();
+    int error = renameEntry(from, to, RENAME_NOREPLACE);
+    if (!lacksNoReplace(error))
+        return error;
+    error = addSecondName(from, to);
+    if (error == 0)
+        if (int const cannotGo = removeFirstName(from, to))
+            throwError(cannotGo, move.from);
+    return error;
+}
+
 int moveFileReplacing(Move const& move, Status const& source)
 {
     std::optional<Status> const target = findTarget(move, Links::Keep);
@@ -192,8 +228,11 @@ bool replaces(ReplacementPolicy policy)
 
 int moveFileWithoutReplacing(At const& from, At const& to)
 {
-    int const error = renameEntry(from, to, RENAME_NOREPLACE);
-    return lacksNoReplace(error) ? moveFileBySecondName(from, to) : error;
+    int error = renameEntry(from, to, RENAME_NOREPLACE);
+    if (!lacksNoReplace(error))
+        return error;
+    error = addSecondName(from, to);
+    return error != 0 ? error : removeFirstName(from, to);
 }
 
 int moveFolderWithoutReplacing(At const& from, At const& to)
@@ -209,8 +248,7 @@ void moveFile(Root const& root, StorageIRI const& from, StorageIRI const& to, Re
     Status const source = requireSource(move);
     if (isFolder(source))
         throwError(ErrorCode::ResourceNotFound, from);
-    int const error = replaces(policy) ? moveFileReplacing(move, source)
-                                       : moveFileWithoutReplacing(move.source.at(), move.target.at());
+    int const error = replaces(policy) ? moveFileReplacing(move, source) : moveFilePreserving(move);
     if (error == EXDEV)
         moveFileAcross(root, from, to, policy, watch);
     else

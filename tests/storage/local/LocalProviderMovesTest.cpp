@@ -331,7 +331,8 @@ TEST_F(LocalProviderMovesWithoutNoReplace, NoFileThatCannotGiveUpItsOldName)
     replaced->unlinkat = [](int at, char const* path, int flags) {
         return path == source ? failWith(EBUSY) : realSystemCalls.unlinkat(at, path, flags);
     };
-    EXPECT_EQ(moveFile(u"source", u"new", ReplacementPolicy::Preserve), failure(ErrorCode::ResourceInUse, at(u"new")));
+    EXPECT_EQ(moveFile(u"source", u"new", ReplacementPolicy::Preserve),
+              failure(ErrorCode::ResourceInUse, at(u"source")));
     EXPECT_EQ(folder.read("source"), "content");
     EXPECT_FALSE(isThere("new"));
 }

@@ -130,6 +130,17 @@ TEST_F(LocalProviderPermissions, AreNeededToKnowWhatExists)
     expectDenied([&] { provider.getFolderAttributes(at(name)); }, name);
 }
 
+TEST_F(LocalProviderPermissions, OfAStickyFolderKeepFilesOfOthers)
+{
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "only root has another user";
+    make("sticky");
+    fs::permissions(folder / "sticky", fs::perms(01777));
+    std::u16string const name = u"sticky/file";
+    expectDenied([&] { provider.moveFile(at(name), at(u"open/new"), ReplacementPolicy::Preserve); }, name);
+    expectDenied([&] { provider.moveFile(at(u"open/file"), at(name), ReplacementPolicy::Overwrite); }, name);
+}
+
 TEST_F(LocalProviderPermissions, AreNeededToChangeAFolder)
 {
     expectDenied([&] { provider.createFile(at(u"unwritable/new")); }, u"unwritable/new");

@@ -5,6 +5,7 @@
 #include <tests/storage/local/ReplacedSystemCalls.hpp>
 #include <tests/support/TemporaryFolder.hpp>
 
+#include <fcntl.h>
 #include <stdexcept>
 #include <string>
 #include <sys/stat.h>
@@ -70,6 +71,12 @@ protected:
     off_t sizeOf(std::string const& name) const { return statusOf(name).st_size; }
     off_t bytesOnDisk(std::string const& name) const { return statusOf(name).st_blocks * 512; }
 
+    bool takeBlocksBeyondTheEnd(off_t count) const
+    {
+        FileDescriptor const file(::open((folder_ / "from").c_str(), O_WRONLY | O_CLOEXEC));
+        return ::fallocate(file.get(), FALLOC_FL_KEEP_SIZE, sizeOf("from"), count) == 0;
+    }
+
     void expectCopied() { EXPECT_TRUE(folder_.read("to") == folder_.read("from")); }
 
     TemporaryFolder folder_;
@@ -105,6 +112,17 @@ TEST_F(CopyContentSparse, KeepsHolesOfWhatTheKernelDoesNotCopy)
     EXPECT_EQ(copy(), CopyOutcome::Completed);
     expectCopied();
     EXPECT_LT(bytesOnDisk("to"), mebibyte);
+}
+
+TEST_F(CopyContentSparse, KeepsHolesOfAFileWithBlocksBeyondItsEnd)
+{
+    make({{0, "x"}, {4 * mebibyte - 1, "y"}}, 4 * mebibyte);
+    if (!hasHoles() || !takeBlocksBeyondTheEnd(8 * mebibyte))
+        GTEST_SKIP() << "the file system makes no holes, or takes no blocks beforehand";
+    ASSERT_GE(bytesOnDisk("from"), 4 * mebibyte);
+    EXPECT_EQ(copy(), CopyOutcome::Completed);
+    expectCopied();
+    EXPECT_LE(bytesOnDisk("to"), 131072);
 }
 
 TEST_F(CopyContentSparse, KeepsASmallFileThatIsAHole)

@@ -50,7 +50,7 @@ constexpr Case cases[] = {
      "a file that is copied to one with a name is not wanted any more"},
     {anything, "ficlone|copy_file_range", anything, any, Ignored::WithSameResult,
      "the content is read and written instead, which tells the end that fails"},
-    {"copySparseFileAtomic", "lseek", "from/sparse", any, Ignored::WithSameResult,
+    {"(copy|move).*", "lseek", "from/(sparse|long)|to/#[0-9]+ \\(deleted\\)", any, Ignored::WithSameResult,
      "where nobody knows the holes or the end, all is copied"},
     {"moveScratchFile", "openat2?", scratch, isForbidden, Ignored::WithSameResult,
      "a file that may not be read is synced by whoever may write it"},

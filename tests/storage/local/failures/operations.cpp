@@ -65,7 +65,6 @@ Operation leaving(Leaves leaves, Operation operation)
 Operation lackingNoReplace(Operation operation)
 {
     operation.name += "BySecondWay";
-    operation.blames = Blames::Either; // an error does not say which of the calls failed
     operation.lacks = [](SystemCall const& call) { return call.name == "renameat2" && call.numberOfKind == 1; };
     return operation;
 }
