@@ -73,10 +73,23 @@ mode_t modeOfCopy(OpenedFile const& source)
     return source.status.stx_mode & permissionBits;
 }
 
+/// Where nothing was found, what others have made since is not replaced, unless a link leads to it.
+int exclusion(Copy const& copy)
+{
+    if (replaces(copy.policy))
+        return 0;
+    Status status;
+    int const error = copy.root.getStatus(copy.toPath, Links::Keep, status);
+    if (error != 0 && !meansMissing(error))
+        throwError(error, copy.to);
+    return error == 0 && isLink(status) ? 0 : O_EXCL;
+}
+
 /// Is not truncated as it is opened: ext4 writes a file that was to the disk when it is closed.
 OpenedFile openTarget(Copy const& copy, OpenedFile const& source)
 {
-    OpenedFile target = openRegularFile(copy.root, copy.toPath, O_WRONLY | O_CREAT, copy.to, modeOfCopy(source));
+    int const flags = O_WRONLY | O_CREAT | exclusion(copy);
+    OpenedFile target = openRegularFile(copy.root, copy.toPath, flags, copy.to, modeOfCopy(source));
     if (target.status.stx_size == 0 || isSameFile(source.status, target.status))
         return target;
     if (int const error = errorOf([&] { return systemCalls().ftruncate(target.file.get(), 0); }))
@@ -108,8 +121,11 @@ CopyResult preserve(Preserved const& preserved, OpenedFile const& source, FileDe
 void copyFile(Settings const& settings, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
 {
     Copy const copy{settings.root, from, to, policy};
-    requireReplaceable(copy);
+    std::optional<Status> const replaced = requireReplaceable(copy);
     OpenedFile const source = openSource(copy);
+    // One that may not be written is not changed, either.
+    if (replaced && isSameFile(source.status, *replaced))
+        return;
     OpenedFile target = openTarget(copy, source);
     if (isSameFile(source.status, target.status))
         return;

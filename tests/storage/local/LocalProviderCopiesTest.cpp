@@ -8,7 +8,10 @@
 #include <tests/support/failureOf.hpp>
 
 #include <algorithm>
+#include <cerrno>
+#include <fcntl.h>
 #include <filesystem>
+#include <fstream>
 #include <iterator>
 #include <string>
 #include <sys/stat.h>
@@ -19,6 +22,7 @@ namespace {
 
 namespace fs = std::filesystem;
 using namespace provider;
+using detail::realSystemCalls;
 using tests::support::failure;
 using tests::support::failureOf;
 using tests::support::failWith;
@@ -284,6 +288,53 @@ TEST_F(LocalProviderCopies, NeverReplaceWhatAppearsMeanwhile)
         EXPECT_EQ(entryCount(), 2);
         fs::remove(folder_ / "to");
     }
+}
+
+/// Between the look at the target and its opening.
+fs::path appearing;
+
+TEST_F(LocalProviderCopies, InPlaceDoNotWriteIntoAFileThatAppearsMeanwhile)
+{
+    folder_.write("from", "content");
+    appearing = folder_ / "to";
+    for (ReplacementPolicy const policy : {ReplacementPolicy::Preserve, ReplacementPolicy::NoClobber}) {
+        fs::remove(appearing);
+        ReplacedSystemCalls replaced;
+        replaced->openat = [](int at, char const* path, int flags, mode_t mode) {
+            if ((flags & O_CREAT) != 0)
+                std::ofstream(appearing) << "of the winner";
+            return realSystemCalls.openat(at, path, flags, mode);
+        };
+        EXPECT_EQ(failureOf([&] { copy(u"from", u"to", policy); }),
+                  failure(ErrorCode::ResourceAlreadyExists, at(u"to")));
+        EXPECT_EQ(folder_.read("to"), "of the winner");
+    }
+}
+
+TEST_F(LocalProviderCopies, InPlaceMakeWhatABrokenLinkLeadsTo)
+{
+    folder_.write("from", "content");
+    fs::create_symlink("missing", folder_ / "link");
+    copy(u"from", u"link", ReplacementPolicy::Preserve);
+    EXPECT_EQ(folder_.read("missing"), "content");
+    EXPECT_TRUE(fs::is_symlink(folder_ / "link"));
+}
+
+TEST_F(LocalProviderCopies, OntoThemselvesNeedNoPermissionToWrite)
+{
+    folder_.write("file", "content");
+    fs::create_symlink("file", folder_ / "link");
+    fs::create_hard_link(folder_ / "file", folder_ / "second name");
+    ReplacedSystemCalls replaced;
+    replaced->openat = [](int at, char const* path, int flags, mode_t mode) {
+        bool const writes = (flags & O_PATH) == 0 && (flags & O_ACCMODE) != O_RDONLY;
+        return writes ? failWith(ETXTBSY) : realSystemCalls.openat(at, path, flags, mode);
+    };
+    for (auto const* const name : {u"file", u"link", u"second name"})
+        withBoth([&](auto const& copy) {
+            EXPECT_EQ(failureOf([&] { copy(u"file", name, ReplacementPolicy::Overwrite); }), "no failure");
+        });
+    EXPECT_EQ(folder_.read("file"), "content");
 }
 
 } // namespace
