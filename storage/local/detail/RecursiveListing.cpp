@@ -85,8 +85,10 @@ void RecursiveListing::leave()
     folder_.reset();
     if (chain_.depth() == 0)
         return;
-    if (int const error = chain_.leave())
-        throwAt(error == ESTALE ? chain_.lostPath() : chain_.path(), error == ESTALE ? ENOENT : error);
+    int const error = chain_.leave();
+    // What others have moved away holds no more than what they have removed.
+    if (error != 0 && error != ESTALE)
+        throwAt(chain_.path(), error);
 }
 
 void RecursiveListing::take(FoundName const& found)

@@ -104,6 +104,7 @@ private:
     void removeFile(char const* name);
     void removeFolder(char const* name);
     void leave();
+    void noteLost();
     void removeEmptied(std::string const& name, Level const& emptied);
     void noteEntry(int error, std::string const& name);
 
@@ -217,12 +218,22 @@ void TreeRemoval::leave()
     levels_.pop_back();
     int const error = chain_.leave();
     levels_.resize(chain_.depth());
-    if (error != 0)
-        noteAt(error, [&] { return error == ESTALE ? chain_.lostPath() : chain_.path(); });
+    if (error == ESTALE)
+        noteLost();
+    else if (error != 0)
+        noteAt(error, [&] { return chain_.path(); });
     else if (!emptied.hasFailed)
         removeEmptied(name, emptied);
     else if (!levels_.empty())
         levels_.back().hasFailed = true;
+}
+
+/// What others have moved away is gone as what they have removed; what they have put in its place is met when the
+/// folder is read again.
+void TreeRemoval::noteLost()
+{
+    if (!levels_.empty())
+        levels_.back().hasChanged = true;
 }
 
 void TreeRemoval::removeEmptied(std::string const& name, Level const& emptied)

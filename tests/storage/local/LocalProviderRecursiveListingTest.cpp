@@ -182,6 +182,23 @@ TEST_F(LocalProviderRecursiveListing, EndsWhereTheTreeIsRemovedAroundIt)
     }
 }
 
+TEST_F(LocalProviderRecursiveListing, PassesOverWhatIsMovedAwayMeanwhile)
+{
+    constexpr std::size_t depth = 100;
+    TemporaryFolder const elsewhere;
+    makeDeepFolders(folder.path(), depth);
+    folder.write("d/later", "");
+    auto const listing = provider.listAllRecursiveNamesOnly(folder.iri());
+    std::multiset<std::u16string> names;
+    for (; listing->entry().getName().size() < 2 * depth - 1; listing->next())
+        names.insert(listing->entry().getName());
+    fs::rename(folder / "d/d/d", elsewhere / "d");
+    fs::rename(elsewhere / "d/d", elsewhere / "inner");
+    EXPECT_EQ(failureOf([&] { names.merge(rest(*listing)); }), "no failure");
+    EXPECT_EQ(names.count(u"d/later"), 1U);
+    EXPECT_EQ(names.count(u"file"), 1U);
+}
+
 TEST_F(LocalProviderRecursiveListing, EntersWhatIsMountedBelow)
 {
     ScopedMount const mount = ScopedMount::fileSystem(folder / "a/b");

@@ -84,6 +84,31 @@ TEST_F(LocalProviderRemoval, GoesAsDeepAsItGets)
     EXPECT_FALSE(exists("tree"));
 }
 
+fs::path moving;
+fs::path place;
+
+TEST_F(LocalProviderRemoval, DoesWithoutWhatIsMovedAwayMeanwhile)
+{
+    TemporaryFolder const elsewhere;
+    makeDeepFolders(folder / "tree", 100, "deeper");
+    moving = folder / "tree/deeper/deeper/deeper";
+    place = elsewhere / "moved";
+    ReplacedSystemCalls calls;
+    calls->getdents64 = [](int descriptor, void* buffer, std::size_t size) {
+        if (fs::read_symlink("/proc/self/fd/" + std::to_string(descriptor)).native().size() >
+                moving.native().size() + 600 &&
+            fs::exists(moving))
+        {
+            fs::rename(moving, place);
+            fs::rename(place / "deeper", place.native() + " from within");
+        }
+        return realSystemCalls.getdents64(descriptor, buffer, size);
+    };
+    EXPECT_EQ(remove(), "no failure");
+    EXPECT_FALSE(exists("tree"));
+    EXPECT_TRUE(fs::exists(place));
+}
+
 TEST_F(LocalProviderRemoval, DoesNotFollowALinkInThePlaceOfTheFolder)
 {
     fs::create_directory_symlink("beside", folder / "link");
