@@ -1,5 +1,6 @@
 #include <storage/local/LocalProvider.hpp>
 
+#include <storage/local/DurabilityException.hpp>
 #include <storage/local/detail/ChangeNotifier.hpp>
 #include <storage/local/detail/LocalByteStream.hpp>
 #include <storage/local/detail/LocalTransaction.hpp>
@@ -19,6 +20,7 @@
 #include <storage/provider/ChangeEventExceptions.hpp>
 
 #include <cerrno>
+#include <deque>
 #include <optional>
 #include <utility>
 
@@ -113,11 +115,38 @@ void LocalProvider::doCreateFolder(StorageIRI const& iri) const
     auto const settings = this->settings();
     Root const& root = settings->root;
     std::string const path = root.pathOf(iri);
-    if (int const error = makeFolder(locate(root, path, iri).at()))
+    bool const isDurable = settings->durability == Durability::Full;
+    Located folder;
+    int error = isDurable ? root.locateInFolder(path, folder) : root.locate(path, folder);
+    if (error == 0)
+        error = makeFolder(folder.at());
+    if (error != 0)
         throwError(error, iri);
-    if (settings->durability == Durability::Full)
-        if (int const error = syncFolderOf(root, path))
+    if (isDurable)
+        if (error = syncFolder(folder.folder()); error != 0)
             throwNotDurable(error, iri);
+}
+
+/// A folder that is made, but not certain to stay, is one into which others can be made.
+void LocalProvider::doCreateFolderRecursive(StorageIRI const& iri) const
+{
+    if (!iri.hasParent())
+        return IConfigurableProvider::doCreateFolderRecursive(iri);
+    std::deque<StorageIRI> missing{iri};
+    while (missing.front().hasParent() && !doFolderExists(missing.front().getParent()))
+        missing.push_front(missing.front().getParent());
+    std::optional<ErrorCode> uncertain;
+    for (StorageIRI const& folder : missing) {
+        try {
+            doCreateFolder(folder);
+        } catch (DurabilityException const& failure) {
+            uncertain = failure.getErrorCode();
+        } catch (Exception const& failure) {
+            throw Exception(failure.getErrorCode(), iri);
+        }
+    }
+    if (uncertain)
+        throw DurabilityException(*uncertain, iri);
 }
 
 bool LocalProvider::doFileExists(StorageIRI const& iri) const

@@ -42,6 +42,7 @@ protected:
 
     void doCreateFile(provider::StorageIRI const& iri) const override;
     void doCreateFolder(provider::StorageIRI const& iri) const override;
+    void doCreateFolderRecursive(provider::StorageIRI const& iri) const override;
     bool doFileExists(provider::StorageIRI const& iri) const override;
     bool doFolderExists(provider::StorageIRI const& iri) const override;
     provider::ExistenceType doExists(provider::StorageIRI const& iri) const override;

@@ -156,6 +156,19 @@ int Root::locateConfined(std::string path, Located& entry) const
     return 0;
 }
 
+int Root::locateInFolder(std::string const& path, Located& entry) const
+{
+    std::string const name = nameOf(path);
+    if (isTop(path) || name == "." || name == "..")
+        return locate(path, entry);
+    entry = Located();
+    if (int const error = open(parentOf(path), O_PATH | O_DIRECTORY, entry.owned_))
+        return error;
+    entry.folder_ = entry.owned_.get();
+    entry.name_ = name;
+    return 0;
+}
+
 int Root::openParent(std::string const& path, FileDescriptor& parent, std::string& name) const
 {
     if (isTop(path))

@@ -18,6 +18,9 @@ class FOUNDATION_API Located
 public:
     At at() const { return {folder_, name_.c_str()}; }
 
+    /// The folder that holds the entry, open where `Root::locateInFolder` found it.
+    int folder() const { return folder_; }
+
 private:
     friend class Root;
 
@@ -65,6 +68,10 @@ public:
 
     /// Finds the folder that holds the last name of a path.
     [[nodiscard]] int locate(std::string const& path, Located& entry) const;
+
+    /// The same, with the folder open: what happens to the entry, and to the folder afterwards, happens in one folder,
+    /// whatever is renamed meanwhile. A last name "." or ".." is located alone.
+    [[nodiscard]] int locateInFolder(std::string const& path, Located& entry) const;
 
     /// Opens the folder that holds the last name of a path, so that what happens there is done to one folder, whatever
     /// is renamed meanwhile. `EBUSY` for the root itself, `EINVAL` where the last name is "." or "..".

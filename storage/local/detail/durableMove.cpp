@@ -41,14 +41,6 @@ void syncScratchFile(Settings const& settings, StorageIRI const& from)
         throwError(error, from);
 }
 
-void makeMoveDurable(Settings const& settings, StorageIRI const& from, StorageIRI const& to)
-{
-    if (settings.durability != Durability::Full)
-        return;
-    if (int const error = syncFoldersOf(settings.root, settings.root.pathOf(from), settings.root.pathOf(to)))
-        throwNotDurable(error, to);
-}
-
 template <typename Action>
 TransactionStatus unlessInterrupted(Action const& action)
 {
@@ -67,18 +59,14 @@ TransactionStatus moveFileDurably(Settings const& settings, StorageIRI const& fr
 {
     return unlessInterrupted([&] {
         syncScratchFile(settings, from);
-        moveFile(settings.root, from, to, policy, MoveWatch(observer));
-        makeMoveDurable(settings, from, to);
+        moveFile(settings, from, to, policy, MoveWatch(observer));
     });
 }
 
 TransactionStatus moveFolderDurably(Settings const& settings, StorageIRI const& from, StorageIRI const& to,
                                     ReplacementPolicy policy, MoveObserver const& observer)
 {
-    return unlessInterrupted([&] {
-        moveFolder(settings.root, from, to, policy, MoveWatch(observer));
-        makeMoveDurable(settings, from, to);
-    });
+    return unlessInterrupted([&] { moveFolder(settings, from, to, policy, MoveWatch(observer)); });
 }
 
 } // namespace foundation::storage::local::detail

@@ -5,6 +5,7 @@
 #include <storage/local/detail/moveAcross.hpp>
 #include <storage/local/detail/nativePath.hpp>
 #include <storage/local/detail/scratchName.hpp>
+#include <storage/local/detail/sync.hpp>
 
 #include <cerrno>
 #include <cstdio>
@@ -22,22 +23,42 @@ namespace {
 /// Both ends of a move, as the client named them and as the system calls do.
 struct Move
 {
-    Move(Root const& store, StorageIRI const& fromIRI, StorageIRI const& toIRI)
-        : root(store), from(fromIRI), to(toIRI), fromPath(root.pathOf(from)), toPath(root.pathOf(to))
+    Move(Settings const& settings, StorageIRI const& fromIRI, StorageIRI const& toIRI)
+        : root(settings.root),
+          isDurable(settings.durability == Durability::Full),
+          from(fromIRI),
+          to(toIRI),
+          fromPath(root.pathOf(from)),
+          toPath(root.pathOf(to))
     {
-        if (int const error = root.locate(fromPath, source))
+        if (int const error = find(fromPath, source))
             throwError(error, from);
-        if (int const error = root.locate(toPath, target))
-            throwError(error, to);
+        missing = find(toPath, target);
+        if (missing != 0 && !meansMissing(missing))
+            throwError(missing, to);
+    }
+
+    /// A source that is missing, too, is complained of first.
+    void requireTargetFolder() const
+    {
+        if (missing != 0)
+            throwError(missing, to);
+    }
+
+    int find(std::string const& path, Located& entry) const
+    {
+        return isDurable ? root.locateInFolder(path, entry) : root.locate(path, entry);
     }
 
     Root const& root;
+    bool const isDurable;
     StorageIRI const& from;
     StorageIRI const& to;
     std::string fromPath;
     std::string toPath;
     Located source;
     Located target;
+    int missing = 0; ///< the `errno` for which there is no folder to hold the target
 };
 
 /// Whether a file has to stay in its folder, although this user may write there: it is fixed, or of somebody else in a
@@ -97,6 +118,16 @@ bool lacksNoReplace(int error)
     return error == EINVAL || error == ENOSYS;
 }
 
+/// The other name may have become the only one, or mean something else.
+void removeSecondName(At const& first, At const& second)
+{
+    Status status;
+    Status other;
+    if (getStatus(first, Links::Keep, status) == 0 && getStatus(second, Links::Keep, other) == 0 &&
+        isSameFile(status, other))
+        removeName(second);
+}
+
 /// For a file system without `RENAME_NOREPLACE`: a second name is never made over an existing one either.
 int addSecondName(At const& from, At const& to)
 {
@@ -108,7 +139,7 @@ int removeFirstName(At const& from, At const& to)
 {
     int const error = removeName(from);
     if (error != 0)
-        removeName(to);
+        removeSecondName(from, to);
     return error;
 }
 
@@ -213,6 +244,22 @@ int moveFileReplacing(Move const& move, Status const& source)
     return error == EISDIR ? EEXIST : error;
 }
 
+void syncFolders(Move const& move)
+{
+    int error = move.isDurable ? syncFolder(move.target.folder()) : 0;
+    if (move.isDurable && error == 0 && parentOf(move.fromPath) != parentOf(move.toPath))
+        error = syncFolder(move.source.folder());
+    if (error != 0)
+        throwNotDurable(error, move.to);
+}
+
+/// That of the target is synced before anything goes.
+void syncFolderOfSource(Move const& move)
+{
+    if (int const error = move.isDurable ? syncFolder(move.source.folder()) : 0)
+        throwNotDurable(error, move.to);
+}
+
 bool isOntoItself(Move const& move, Status const& source)
 {
     std::optional<Status> const target = findTarget(move, Links::Follow);
@@ -241,37 +288,43 @@ int moveFolderWithoutReplacing(At const& from, At const& to)
     return lacksNoReplace(error) ? moveFolderOntoNewFolder(from, to) : error;
 }
 
-void moveFile(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy,
+void moveFile(Settings const& settings, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy,
               MoveWatch const& watch)
 {
-    Move const move(root, from, to);
+    Move const move(settings, from, to);
     Status const source = requireSource(move);
     if (isFolder(source))
         throwError(ErrorCode::ResourceNotFound, from);
+    move.requireTargetFolder();
     int const error = replaces(policy) ? moveFileReplacing(move, source) : moveFilePreserving(move);
-    if (error == EXDEV)
-        moveFileAcross(root, from, to, policy, watch);
-    else
-        requireMoved(error, move);
+    if (error == EXDEV) {
+        moveFileAcross(move.root, from, to, policy, watch);
+        return syncFolderOfSource(move);
+    }
+    requireMoved(error, move);
+    syncFolders(move);
 }
 
-void moveFolder(Root const& root, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy,
+void moveFolder(Settings const& settings, StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy,
                 MoveWatch const& watch)
 {
-    Move const move(root, from, to);
+    Move const move(settings, from, to);
     Status const source = requireSource(move);
     if (!isFolder(source))
-        throwNotAFolder(root, move.fromPath, from);
+        throwNotAFolder(move.root, move.fromPath, from);
+    move.requireTargetFolder();
     int error = moveFolderWithoutReplacing(move.source.at(), move.target.at());
     // Two file systems are told apart before anything is looked for.
     if (error == EXDEV && findTarget(move, Links::Keep))
         error = EEXIST;
     if (error == EEXIST && replaces(policy) && isOntoItself(move, source))
         return;
-    if (error == EXDEV)
-        moveFolderAcross(root, from, to, watch);
-    else
-        requireMoved(error, move);
+    if (error == EXDEV) {
+        moveFolderAcross(move.root, from, to, watch);
+        return syncFolderOfSource(move);
+    }
+    requireMoved(error, move);
+    syncFolders(move);
 }
 
 void throwNotAFolder(Root const& root, std::string const& path, StorageIRI const& iri)

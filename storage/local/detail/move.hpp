@@ -2,6 +2,7 @@
 
 #include <storage/local/detail/MoveWatch.hpp>
 #include <storage/local/detail/Root.hpp>
+#include <storage/local/detail/Settings.hpp>
 #include <storage/local/detail/fileSystem.hpp>
 #include <storage/provider/ReplacementPolicy.hpp>
 #include <storage/provider/StorageIRI.hpp>
@@ -17,11 +18,12 @@ bool replaces(provider::ReplacementPolicy policy);
 /// The same for a folder, which replaces nothing at all.
 [[nodiscard]] int moveFolderWithoutReplacing(At const& from, At const& to);
 
-// From one file system to another they copy, see `moveAcross.hpp`.
+// From one file system to another they copy, see `moveAcross.hpp`. Under `Durability::Full` both folders are synced,
+// that of the target first: in this order a power failure can leave what is moved with both names, never without one.
 
-void moveFile(Root const& root, provider::StorageIRI const& from, provider::StorageIRI const& to,
+void moveFile(Settings const& settings, provider::StorageIRI const& from, provider::StorageIRI const& to,
               provider::ReplacementPolicy policy, MoveWatch const& watch);
-void moveFolder(Root const& root, provider::StorageIRI const& from, provider::StorageIRI const& to,
+void moveFolder(Settings const& settings, provider::StorageIRI const& from, provider::StorageIRI const& to,
                 provider::ReplacementPolicy policy, MoveWatch const& watch);
 
 /// Throws what is wrong with a location where a folder itself, not a link to one, had to stand.

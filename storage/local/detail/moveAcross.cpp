@@ -134,16 +134,15 @@ void copyRegularFile(Root const& root, Source& source, StorageIRI const& to, Rep
 
 void copyLink(Root const& root, Source const& source, StorageIRI const& to, ReplacementPolicy policy)
 {
-    std::string const path = root.pathOf(to);
     FileDescriptor folder;
     std::string name;
-    if (int const error = root.openParent(path, folder, name))
+    if (int const error = root.openParent(root.pathOf(to), folder, name))
         throwError(error, to);
     ScratchLink scratch(folder);
     requireMoved(moveLink(source.at(), source.status(), scratch.at()), source.iri(), to);
     if (int const error = scratch.putInPlace({folder.get(), name.c_str()}, policy))
         throwError(error, to);
-    if (int const error = syncFolderOf(root, path))
+    if (int const error = syncFolder(folder.get()))
         throwNotDurable(error, to);
 }
 

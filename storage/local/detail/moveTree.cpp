@@ -264,7 +264,7 @@ void moveFolderAcross(Root const& root, StorageIRI const& from, StorageIRI const
     inspect(source, target, watch);
     Copied copied;
     copyTree(source, target, copied, watch);
-    if (int const error = syncFolderOf(root, root.pathOf(to)))
+    if (int const error = syncFolder(target.parent.get()))
         throwNotDurable(error, to);
     removeCopied(source, copied);
 }

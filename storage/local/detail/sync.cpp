@@ -3,9 +3,11 @@
 #include <storage/local/DurabilityException.hpp>
 #include <storage/local/detail/SystemCalls.hpp>
 #include <storage/local/detail/errorCode.hpp>
-#include <storage/local/detail/nativePath.hpp>
+#include <storage/local/detail/fileSystem.hpp>
+#include <storage/local/detail/scratchName.hpp>
 
 #include <cerrno>
+#include <string>
 
 namespace foundation::storage::local::detail {
 
@@ -18,21 +20,29 @@ bool meansNotByItself(int error)
     return error == EINVAL || error == ENOSYS || error == EOPNOTSUPP;
 }
 
-/// A folder that the user may write to but not read cannot be synced by itself; an entry that was in it leads to its
-/// file system as well.
-int syncParent(Root const& root, std::string const& path, std::string const& entry)
+bool meansNeverNameless(int error)
 {
-    FileDescriptor folder;
-    int error = root.open(parentOf(path), O_RDONLY | O_DIRECTORY, folder);
-    if (error == 0)
-        return sync(folder, folder);
-    if (error != EACCES)
+    return error == EOPNOTSUPP || error == EISDIR || error == EINVAL || error == ENOENT;
+}
+
+int openNewFile(int folder, FileDescriptor& file)
+{
+    int const error = openFile({folder, "."}, O_WRONLY | O_TMPFILE, file, 0);
+    if (!meansNeverNameless(error))
         return error;
-    error = root.open(entry, O_RDONLY | O_NOFOLLOW | O_NOCTTY | O_NONBLOCK, folder);
-    // A link cannot be opened: it is the folder that cannot be synced.
-    if (error == ELOOP)
-        return EACCES;
-    return error != 0 ? error : syncFileSystem(folder);
+    std::string const name = scratchName();
+    if (int const failure = openFile({folder, name.c_str()}, O_WRONLY | O_CREAT | O_EXCL, file, 0))
+        return failure;
+    return removeName({folder, name.c_str()});
+}
+
+/// A folder that the user may write to but not read cannot be synced by itself. A new file in it leads to its file
+/// system; what else is in it need not be readable, either.
+int syncFileSystemOf(int folder)
+{
+    FileDescriptor file;
+    int const error = openNewFile(folder, file);
+    return error != 0 ? error : syncFileSystem(file);
 }
 
 } // namespace
@@ -48,15 +58,13 @@ int syncFileSystem(FileDescriptor const& file)
     return errorOf([&] { return systemCalls().syncfs(file.get()); });
 }
 
-int syncFolderOf(Root const& root, std::string const& path)
+int syncFolder(int folder)
 {
-    return syncParent(root, path, path);
-}
-
-int syncFoldersOf(Root const& root, std::string const& from, std::string const& to)
-{
-    int const error = syncParent(root, to, to);
-    return error != 0 || parentOf(from) == parentOf(to) ? error : syncParent(root, from, to);
+    FileDescriptor readable;
+    int const error = openFile({folder, "."}, O_RDONLY | O_DIRECTORY, readable);
+    if (error == EACCES)
+        return syncFileSystemOf(folder);
+    return error != 0 ? error : sync(readable, readable);
 }
 
 void throwNotDurable(int error, provider::StorageIRI const& target)

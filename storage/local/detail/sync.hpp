@@ -1,10 +1,7 @@
 #pragma once
 
 #include <storage/local/detail/FileDescriptor.hpp>
-#include <storage/local/detail/Root.hpp>
 #include <storage/provider/StorageIRI.hpp>
-
-#include <string>
 
 namespace foundation::storage::local::detail {
 
@@ -17,12 +14,9 @@ namespace foundation::storage::local::detail {
 /// Syncs the file system that holds an open file.
 [[nodiscard]] int syncFileSystem(FileDescriptor const& file);
 
-/// Syncs the folder that holds a new entry.
-[[nodiscard]] int syncFolderOf(Root const& root, std::string const& path);
-
-/// Syncs the folder that an entry was moved to, and then the one that it came from: in this order a power failure can
-/// leave it with both names, never without one.
-[[nodiscard]] int syncFoldersOf(Root const& root, std::string const& from, std::string const& to);
+/// Syncs the names in an open folder, which may have been opened with `O_PATH`. Where this user may write to the folder
+/// but not read it, its file system is synced.
+[[nodiscard]] int syncFolder(int folder);
 
 /// Throws the `DurabilityException` for the `errno` of a sync that came after a change.
 [[noreturn]] void throwNotDurable(int error, provider::StorageIRI const& target);

@@ -16,6 +16,7 @@
 #include <sys/stat.h>
 #include <sys/xattr.h>
 #include <unistd.h>
+#include <vector>
 
 namespace foundation::storage::local {
 namespace {
@@ -224,7 +225,8 @@ void replaceBefore(std::string_view name)
 void replaceChangingBeforeItGoes(ReplacedSystemCalls& replaced)
 {
     replaced->renameat2 = [](int fromFolder, char const* old, int toFolder, char const* name, unsigned flags) {
-        replaceBefore(old);
+        if (fromFolder == toFolder)
+            replaceBefore(old);
         return realSystemCalls.renameat2(fromFolder, old, toFolder, name, flags);
     };
     replaced->unlinkat = [](int folder, char const* path, int flags) {
@@ -291,6 +293,36 @@ TEST_F(LocalProviderMovesAcrossFileSystems, SyncWhateverTheSettingSays)
     };
     EXPECT_EQ(moveFile(u"file", u"new"), moved);
     EXPECT_FALSE(fs::exists(from / "file"));
+}
+
+/// Whether this opens a folder of a file system to read it.
+bool readsFolderOf(dev_t device, int at, int flags)
+{
+    struct stat status = {};
+    return (flags & O_DIRECTORY) != 0 && (flags & (O_PATH | O_TMPFILE)) == O_DIRECTORY && ::fstat(at, &status) == 0 &&
+           status.st_dev == device;
+}
+
+TEST_F(LocalProviderMovesAcrossFileSystems, SyncTheFileSystemOfASourceWhoseFolderMayNotBeRead)
+{
+    from.write("file", "content");
+    static dev_t device;
+    static std::vector<dev_t> synced;
+    device = statusOf(from.path()).st_dev;
+    synced.clear();
+    ReplacedSystemCalls replaced;
+    replaced->openat = [](int at, char const* path, int flags, mode_t mode) {
+        return readsFolderOf(device, at, flags) ? failWith(EACCES) : realSystemCalls.openat(at, path, flags, mode);
+    };
+    replaced->syncfs = [](int descriptor) {
+        struct stat status = {};
+        EXPECT_EQ(::fstat(descriptor, &status), 0);
+        synced.push_back(status.st_dev);
+        return realSystemCalls.syncfs(descriptor);
+    };
+    EXPECT_EQ(moveFile(u"file", u"new"), moved);
+    EXPECT_EQ(synced, std::vector<dev_t>{device});
+    EXPECT_EQ(countIn(from), 0u);
 }
 
 class LocalProviderFolderMovesAcrossFileSystems : public LocalProviderMovesAcrossFileSystems

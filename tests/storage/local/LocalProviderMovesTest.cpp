@@ -10,7 +10,9 @@
 
 #include <cstdio>
 #include <filesystem>
+#include <fstream>
 #include <string>
+#include <string_view>
 #include <sys/stat.h>
 #include <utility>
 #include <vector>
@@ -265,6 +267,11 @@ int renameWithoutFlags(int fromFolder, char const* from, int toFolder, char cons
     return flags != 0 ? failWith(EINVAL) : realSystemCalls.renameat2(fromFolder, from, toFolder, to, flags);
 }
 
+bool isSource(std::string_view path)
+{
+    return path == "source" || path.ends_with("/source");
+}
+
 class LocalProviderMovesWithoutNoReplace : public testing::Test, protected Entries
 {
 protected:
@@ -326,15 +333,43 @@ TEST_F(LocalProviderMovesWithoutNoReplace, NoFileWhereThereAreNoSecondNamesEithe
 
 TEST_F(LocalProviderMovesWithoutNoReplace, NoFileThatCannotGiveUpItsOldName)
 {
-    static std::string source;
-    source = (folder / "source").string();
     replaced->unlinkat = [](int at, char const* path, int flags) {
-        return path == source ? failWith(EBUSY) : realSystemCalls.unlinkat(at, path, flags);
+        return isSource(path) ? failWith(EBUSY) : realSystemCalls.unlinkat(at, path, flags);
     };
     EXPECT_EQ(moveFile(u"source", u"new", ReplacementPolicy::Preserve),
               failure(ErrorCode::ResourceInUse, at(u"source")));
     EXPECT_EQ(folder.read("source"), "content");
     EXPECT_FALSE(isThere("new"));
+}
+
+TEST_F(LocalProviderMovesWithoutNoReplace, AFileThatCannotGiveUpItsOldNameRemovesNothingElse)
+{
+    static fs::path target;
+    target = folder / "new";
+    replaced->unlinkat = [](int at, char const* path, int flags) {
+        if (!isSource(path))
+            return realSystemCalls.unlinkat(at, path, flags);
+        fs::remove(target);
+        std::ofstream(target) << "of somebody else";
+        return failWith(EBUSY);
+    };
+    EXPECT_EQ(moveFile(u"source", u"new", ReplacementPolicy::Preserve),
+              failure(ErrorCode::ResourceInUse, at(u"source")));
+    EXPECT_EQ(folder.read("source"), "content");
+    EXPECT_EQ(folder.read("new"), "of somebody else");
+}
+
+TEST_F(LocalProviderMovesWithoutNoReplace, AFileWhoseOldNameSomebodyHasRemovedStays)
+{
+    static fs::path source;
+    source = folder / "source";
+    replaced->unlinkat = [](int at, char const* path, int flags) {
+        if (isSource(path))
+            fs::remove(source);
+        return realSystemCalls.unlinkat(at, path, flags);
+    };
+    failureOf([&] { moveFile(u"source", u"new", ReplacementPolicy::Preserve); });
+    EXPECT_EQ(folder.read("new"), "content");
 }
 
 class LocalProviderWatchedMoves : public testing::Test, protected Entries
@@ -376,8 +411,10 @@ TEST_F(LocalProviderWatchedMoves, NameTheSourceWhenItVanishesMeanwhile)
 
 TEST_F(LocalProviderWatchedMoves, ReplaceNoFolderThatAppearsMeanwhile)
 {
+    static fs::path target;
+    target = folder / "new";
     replaced->renameat2 = [](int fromFolder, char const* from, int toFolder, char const* to, unsigned flags) {
-        fs::create_directory(to);
+        fs::create_directory(target);
         return realSystemCalls.renameat2(fromFolder, from, toFolder, to, flags);
     };
     EXPECT_EQ(moveFile(u"source", u"new", ReplacementPolicy::Overwrite),
@@ -388,10 +425,9 @@ TEST_F(LocalProviderWatchedMoves, ReplaceNoFolderThatAppearsMeanwhile)
 TEST_F(LocalProviderWatchedMoves, LeaveBothNamesOfAFileAsTheyWere)
 {
     fs::create_hard_link(folder / "source", folder / "second name");
-    static std::string target;
-    target = (folder / "second name").string();
     replaced->renameat2 = [](int fromFolder, char const* from, int toFolder, char const* to, unsigned flags) {
-        return to == target ? failWith(EIO) : realSystemCalls.renameat2(fromFolder, from, toFolder, to, flags);
+        bool const isTarget = std::string_view(to).ends_with("second name");
+        return isTarget ? failWith(EIO) : realSystemCalls.renameat2(fromFolder, from, toFolder, to, flags);
     };
     std::size_t const entries = count();
     EXPECT_EQ(moveFile(u"source", u"second name", ReplacementPolicy::Overwrite),

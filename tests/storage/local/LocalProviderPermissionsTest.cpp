@@ -168,6 +168,37 @@ TEST_F(LocalProviderPermissions, OfAReadOnlyFileDoNotKeepItsCopyFromHavingAttrib
     EXPECT_EQ(fs::status(folder / "open/copy").permissions(), fs::perms(0444));
 }
 
+/// All of it waits for the disk, for which such a folder cannot be opened.
+TEST_F(LocalProviderPermissions, ToWriteToAFolderAreEnoughWithoutThoseToReadIt)
+{
+    fs::permissions(folder / "open", fs::perms(0333));
+    folder.write("open/unreadable", "secret");
+    fs::permissions(folder / "open/unreadable", fs::perms(0));
+    make("writable");
+    fs::permissions(folder / "writable", fs::perms(0777));
+    fs::create_symlink("nothing", folder / "writable/link");
+    auto const doneByNobody = [&](std::function<void()> const& action) {
+        return askedByNobody([&] { return failureOf(action); });
+    };
+    std::string const done = "no failure";
+    EXPECT_EQ(doneByNobody([&] {
+                  auto const stream = provider.openTransactionalStream(at(u"open/new"), {});
+                  stream->close(StreamClosePolicy::Commit);
+              }),
+              done);
+    EXPECT_EQ(doneByNobody([&] { provider.createFolder(at(u"open/folder")); }), done);
+    auto const move = [&](std::u16string const& from, std::u16string const& to) {
+        return doneByNobody([&] { provider.moveFile(at(from), at(to), ReplacementPolicy::Preserve); });
+    };
+    EXPECT_EQ(move(u"writable/file", u"open/moved"), done);
+    EXPECT_EQ(move(u"open/moved", u"writable/back"), done);
+    EXPECT_EQ(move(u"writable/link", u"open/link"), done);
+    EXPECT_EQ(move(u"open/unreadable", u"open/renamed"), done);
+    for (char const* const name : {"open/new", "open/folder", "writable/back", "open/renamed"})
+        EXPECT_TRUE(fs::exists(folder / name)) << name;
+    EXPECT_TRUE(fs::is_symlink(folder / "open/link"));
+}
+
 TEST_F(LocalProviderPermissions, AreNeededToOpenAFile)
 {
     expectDenied([&] { provider.openReadOnlyStream(at(u"unreadable file")); }, u"unreadable file");

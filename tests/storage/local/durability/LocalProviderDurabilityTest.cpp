@@ -14,6 +14,7 @@
 #include <filesystem>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <unistd.h>
 #include <utility>
 #include <vector>
@@ -23,6 +24,7 @@ namespace {
 
 namespace fs = std::filesystem;
 using namespace provider;
+using detail::realSystemCalls;
 using tests::support::failure;
 using tests::support::failureOf;
 using tests::support::failWith;
@@ -274,6 +276,90 @@ TEST_F(LocalProviderDurability, SaysThatANewFolderOrAMoveIsNotCertain)
     EXPECT_THROW(provider.createFolder(at(u"new")), DurabilityException);
     EXPECT_THROW(provider.moveFile(at(u"file"), at(u"new/file"), ReplacementPolicy::Preserve), DurabilityException);
     EXPECT_EQ(folder.read("new/file"), "old");
+}
+
+TEST_F(LocalProviderDurability, MakesAllFoldersBeforeItSaysThatTheyAreNotCertain)
+{
+    ReplacedSystemCalls replaced;
+    replaced->fsync = [](int) { return failWith(EIO); };
+    try {
+        provider.createFolderRecursive(at(u"a/b/c"));
+        ADD_FAILURE() << "nothing is reported";
+    } catch (DurabilityException const& error) {
+        EXPECT_EQ(error.getErrorCode(), ErrorCode::IOError);
+        EXPECT_EQ(error.getStorageIRI(), at(u"a/b/c"));
+    }
+    EXPECT_TRUE(fs::is_directory(folder / "a/b/c"));
+}
+
+TEST_F(LocalProviderDurability, DoesNotCallAFolderUncertainThatCouldNotBeMade)
+{
+    ReplacedSystemCalls replaced;
+    replaced->fsync = [](int) { return failWith(EIO); };
+    replaced->mkdirat = [](int at, char const* path, mode_t mode) {
+        return std::string_view(path).ends_with('b') ? failWith(ENOSPC) : realSystemCalls.mkdirat(at, path, mode);
+    };
+    EXPECT_EQ(failureOf([&] { provider.createFolderRecursive(at(u"a/b/c")); }),
+              failure(ErrorCode::NoSpaceLeft, at(u"a/b/c")));
+}
+
+fs::path swapped;
+
+void swapFolder()
+{
+    if (fs::exists(swapped.native() + " away"))
+        return;
+    fs::rename(swapped, swapped.native() + " away");
+    fs::create_directory(swapped);
+}
+
+/// Folders that are swapped for others once something has been put into them.
+class LocalProviderDurabilityInSwappedFolders : public LocalProviderDurability
+{
+protected:
+    LocalProviderDurabilityInSwappedFolders()
+    {
+        swapped = folder / "a";
+        fs::create_directory(swapped);
+        synced.clear();
+        replaced->fsync = [](int descriptor) {
+            synced.push_back(fs::read_symlink("/proc/self/fd/" + std::to_string(descriptor)).filename());
+            return realSystemCalls.fsync(descriptor);
+        };
+        replaced->renameat2 = [](int from, char const* name, int to, char const* newName, unsigned flags) {
+            int const result = realSystemCalls.renameat2(from, name, to, newName, flags);
+            swapFolder();
+            return result;
+        };
+        replaced->mkdirat = [](int at, char const* path, mode_t mode) {
+            int const result = realSystemCalls.mkdirat(at, path, mode);
+            swapFolder();
+            return result;
+        };
+    }
+
+    inline static Told synced;
+    ReplacedSystemCalls replaced;
+};
+
+TEST_F(LocalProviderDurabilityInSwappedFolders, IsThatOfTheFolderThatHoldsTheNewOne)
+{
+    provider.createFolder(at(u"a/new"));
+    EXPECT_EQ(synced, Told{"a away"});
+}
+
+TEST_F(LocalProviderDurabilityInSwappedFolders, IsThatOfTheFolderThatHoldsWhatWasMoved)
+{
+    provider.moveFile(at(u"file"), at(u"a/file"), ReplacementPolicy::Preserve);
+    EXPECT_EQ(synced, (Told{"a away", folderName()}));
+    EXPECT_EQ(folder.read("a away/file"), "old");
+}
+
+TEST_F(LocalProviderDurabilityInSwappedFolders, IsThatOfTheFolderThatHeldIt)
+{
+    folder.write("a/inner", "inner");
+    provider.moveFile(at(u"a/inner"), at(u"inner"), ReplacementPolicy::Preserve);
+    EXPECT_EQ(synced, (Told{folderName(), "a away"}));
 }
 
 TEST_F(LocalProviderDurability, LeavesNoScratchFileBehindAnException)
