@@ -30,8 +30,45 @@ int openBeneath(int folder, char const* path, open_how const& how, FileDescripto
     return error;
 }
 
+/// Opens the folder that another file system is mounted on, the first on the way, without following any link to it.
+/// Answers `EACCES` where there is none. What is left of the path goes on from there.
+int openMounted(int folder, std::string& path, FileDescriptor& mounted)
+{
+    open_how how{.flags = O_PATH | O_DIRECTORY | O_CLOEXEC, .mode = 0, .resolve = 0};
+    int error = 0;
+    std::size_t end = 0;
+    for (; error == 0 && end != std::string::npos; end = path.find('/', end + 1)) {
+        how.resolve = beneath | RESOLVE_NO_SYMLINKS | RESOLVE_NO_XDEV;
+        FileDescriptor onTheWay;
+        std::string const way = path.substr(0, path.find('/', end + 1));
+        error = openBeneath(folder, way.c_str(), how, onTheWay);
+        if (error != EXDEV)
+            continue;
+        how.resolve = beneath | RESOLVE_NO_SYMLINKS;
+        error = openBeneath(folder, way.c_str(), how, mounted);
+        path.erase(0, path.find_first_not_of('/', way.size()));
+        return error;
+    }
+    return error == 0 || error == ELOOP ? EACCES : error;
+}
+
+/// Follows links, none of which leads from one file system to another.
+int openWithinMounts(int folder, std::string path, open_how how, FileDescriptor& file)
+{
+    how.resolve = beneath | RESOLVE_NO_XDEV;
+    int error = EXDEV;
+    for (FileDescriptor mounted; error == EXDEV;) {
+        FileDescriptor next;
+        if (int const failure = openMounted(mounted.isOpen() ? mounted.get() : folder, path, next))
+            return failure == EXDEV ? EACCES : failure;
+        mounted = std::move(next);
+        error = openBeneath(mounted.get(), path.empty() ? "." : path.c_str(), how, file);
+    }
+    return error;
+}
+
 /// Other file systems are entered by their mount points, not by links to them: a path that enters one is resolved again
-/// without following any link.
+/// without following any link, and one with links in the other file system again from where that is mounted.
 int openConfined(int folder, char const* path, int flags, mode_t mode, FileDescriptor& file)
 {
     bool const isCreating = (flags & O_CREAT) != 0 || (flags & O_TMPFILE) == O_TMPFILE;
@@ -43,11 +80,16 @@ int openConfined(int folder, char const* path, int flags, mode_t mode, FileDescr
         return error;
     how.resolve = beneath | RESOLVE_NO_SYMLINKS;
     error = openBeneath(folder, path, how, file);
-    return error == EXDEV || error == ELOOP ? EACCES : error;
+    if (error == ELOOP)
+        return openWithinMounts(folder, path, how, file);
+    return error == EXDEV ? EACCES : error;
 }
 
-std::string withoutTrailingSlashes(std::string path)
+/// With one slash between names, and none at the end.
+std::string withoutSuperfluousSlashes(std::string path)
 {
+    auto const isRepeated = [](char left, char right) { return left == '/' && right == '/'; };
+    path.erase(std::unique(path.begin(), path.end(), isRepeated), path.end());
     path.resize(std::max<std::size_t>(path.find_last_not_of('/') + 1, 1));
     return path;
 }
@@ -63,7 +105,7 @@ Root::Root(std::string const& path)
 {
     if (!path.starts_with('/') || path.find('\0') != std::string::npos)
         refuseRoot(path, "it is no absolute path");
-    path_ = withoutTrailingSlashes(path);
+    path_ = withoutSuperfluousSlashes(path);
     if (int const error = openFile({.path = path_.c_str()}, O_PATH | O_DIRECTORY, folder_))
         refuseRoot(path, std::generic_category().message(error));
     FileDescriptor self;
@@ -73,7 +115,7 @@ Root::Root(std::string const& path)
 
 std::string Root::pathOf(provider::StorageIRI const& iri) const
 {
-    std::string path = nativePath(iri);
+    std::string path = isConfined() ? withoutSuperfluousSlashes(nativePath(iri)) : nativePath(iri);
     bool const isInside = !isConfined() || path_ == "/" ||
                           (path.starts_with(path_) && (path.size() == path_.size() || path[path_.size()] == '/'));
     if (!isInside)

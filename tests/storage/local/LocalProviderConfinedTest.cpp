@@ -276,6 +276,43 @@ TEST_F(LocalProviderConfined, EntersWhatIsMountedInsideByItsPathAndByNoLink)
     EXPECT_FALSE(fs::exists(folder / "root/mounted/new"));
 }
 
+TEST_F(LocalProviderConfined, FollowsLinksInWhatIsMountedInsideThatStayThere)
+{
+    fs::create_directory(folder / "root/mounted");
+    ScopedMount const mount = ScopedMount::fileSystem(folder / "root/mounted");
+    if (!mount)
+        GTEST_SKIP() << "this user may not mount";
+    fs::create_directories(folder / "root/mounted/a/inner");
+    ScopedMount const inner = ScopedMount::fileSystem(folder / "root/mounted/a/inner");
+    confine();
+    folder.write("root/mounted/a/file", "content");
+    folder.write("root/mounted/a/inner/file", "inner content");
+    fs::create_symlink("a/file", folder / "root/mounted/link");
+    fs::create_directory_symlink("a", folder / "root/mounted/to a");
+    fs::create_symlink("file", folder / "root/mounted/a/inner/link");
+    fs::create_symlink("../file", folder / "root/mounted/out");
+    fs::create_symlink("/etc/passwd", folder / "root/mounted/absolute");
+    fs::create_directory_symlink("a/inner", folder / "root/mounted/to inner");
+    EXPECT_EQ(provider.getFileAttributes(at(u"root/mounted/link")).getSize(), 7U);
+    EXPECT_EQ(provider.getFileAttributes(at(u"root/mounted/to a/file")).getSize(), 7U);
+    EXPECT_EQ(provider.getFileAttributes(at(u"root/mounted/a/inner/link")).getSize(), 13U);
+    provider.createFile(at(u"root/mounted/to a/made"));
+    EXPECT_TRUE(fs::exists(folder / "root/mounted/a/made"));
+    for (auto const* const name : {u"root/mounted/out", u"root/mounted/absolute", u"root/mounted/to inner/file",
+                                   u"root/mounted/to a/../../file"})
+        EXPECT_EQ(failureOf([&] { provider.openReadOnlyStream(at(name)); }),
+                  failure(ErrorCode::PermissionDenied, at(name)));
+}
+
+TEST_F(LocalProviderConfined, CountsNoSlashTwice)
+{
+    std::u16string path = at(u"root/file").getPath();
+    path.insert(path.rfind(u"/root/"), u"//");
+    StorageIRI const file(StorageIRI(u"file:///"), path);
+    ASSERT_NE(file.getPath().find(u"///root/"), std::u16string::npos);
+    EXPECT_TRUE(provider.fileExists(file));
+}
+
 TEST_F(LocalProviderConfined, StaysInAFolderThatIsRenamed)
 {
     fs::rename(folder / "root", folder / "elsewhere");
