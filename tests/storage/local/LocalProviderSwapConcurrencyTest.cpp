@@ -6,8 +6,10 @@
 #include <storage/provider/Exception.hpp>
 #include <tests/support/TemporaryFolder.hpp>
 
+#include <algorithm>
 #include <array>
 #include <atomic>
+#include <boost/any.hpp>
 #include <boost/date_time/posix_time/posix_time.hpp>
 #include <boost/property_tree/ptree.hpp>
 #include <chrono>
@@ -35,10 +37,10 @@ using tests::support::TemporaryFolder;
 using Clock = std::chrono::steady_clock;
 
 /// The slower the program, the less it does in its time; a sanitizer looks for other faults.
-#ifdef __SANITIZE_THREAD__
+#if defined(__SANITIZE_THREAD__) || defined(__SANITIZE_ADDRESS__)
 constexpr auto duration = 1s;
 #else
-constexpr auto duration = 5s;
+constexpr auto duration = 20s;
 #endif
 
 /// How long what must happen at some time is waited for.
@@ -51,8 +53,8 @@ public:
     Swapper(fs::path left, fs::path right)
         : thread_([this, left = std::move(left), right = std::move(right)](std::stop_token const& stop) {
               while (!stop.stop_requested()) {
-                  ::renameat2(AT_FDCWD, left.c_str(), AT_FDCWD, right.c_str(), RENAME_EXCHANGE);
-                  ++swaps_;
+                  if (::renameat2(AT_FDCWD, left.c_str(), AT_FDCWD, right.c_str(), RENAME_EXCHANGE) == 0)
+                      ++swaps_;
               }
           })
     {
@@ -72,29 +74,41 @@ protected:
     LocalProviderSwapConcurrency()
     {
         fs::create_directories(folder / "outside/deep");
+        fs::create_directories(folder / "outside/folder outside/deep");
+        fs::create_directory(folder / "outside/empty outside");
         for (char const* const name : {"outside/who", "outside/known outside", "outside/deep/known outside"})
             folder.write(name, "outside");
         untouched = outside();
         makePlace();
     }
 
-    void makePlace() const
+    void makePlace(std::string const& place = "place") const
     {
-        fs::create_directories(folder / "place/tree/swapped/deep");
-        fs::create_directory_symlink(folder / "outside", folder / "place/link");
+        fs::create_directories(folder / (place + "/tree/swapped/deep"));
+        fs::create_directory_symlink(folder / "outside", folder / (place + "/link"));
         for (char const* const name : {"swapped/who", "swapped/within", "swapped/deep/within", "beside"})
-            folder.write(std::string("place/tree/") + name, "within");
+            folder.write(place + "/tree/" + name, "within");
+    }
+
+    /// Puts a new place where the old one was, which becomes "used". Whoever swaps need not pause for that.
+    void renewPlace() const
+    {
+        fs::remove_all(folder / "used");
+        makePlace("used");
+        ASSERT_EQ(
+            ::renameat2(AT_FDCWD, (folder / "used").c_str(), AT_FDCWD, (folder / "place").c_str(), RENAME_EXCHANGE), 0);
     }
 
     Swapper swap() const { return Swapper(folder / "place/tree/swapped", folder / "place/link"); }
 
-    /// What stands outside, by path; of folders nothing but that.
+    /// What stands outside with its permissions, by path.
     std::map<std::string, std::string> outside() const
     {
         std::map<std::string, std::string> found;
         for (auto const& entry : fs::recursive_directory_iterator(folder / "outside")) {
             std::string const name = entry.path().lexically_relative(folder.path());
-            found[name] = entry.is_regular_file() ? folder.read(name) : "";
+            auto const mode = std::to_string(static_cast<unsigned>(entry.status().permissions()));
+            found[name] = mode + ' ' + (entry.is_regular_file() ? folder.read(name) : "");
         }
         return found;
     }
@@ -133,22 +147,18 @@ TEST_F(LocalProviderSwapConcurrency, LeadsNoRecursiveRemovalOutside)
     expectSwappingToMatter();
     int removed = 0;
     int kept = 0;
+    Swapper const swapper = swap();
     auto const end = Clock::now() + duration;
     while (Clock::now() < end || removed == 0 || kept == 0) {
         ASSERT_LT(Clock::now(), end + patience)
             << removed << " times the folder was met, " << kept << " times the link";
-        fs::remove_all(folder / "place");
-        makePlace();
-        {
-            Swapper const swapper = swap();
-            try {
-                provider.removeFolderRecursively(folder.iri(u"place/tree"));
-            } catch (Exception const&) {
-                // Who is interfered with all the time need not come to an end.
-            }
+        try {
+            provider.removeFolderRecursively(folder.iri(u"place/tree"));
+        } catch (Exception const&) {
+            // Who is interfered with all the time need not come to an end.
         }
-        bool const isKept =
-            fs::exists(folder / "place/link/within") || fs::exists(folder / "place/tree/swapped/within");
+        renewPlace();
+        bool const isKept = fs::exists(folder / "used/link/within") || fs::exists(folder / "used/tree/swapped/within");
         ++(isKept ? kept : removed);
         ASSERT_EQ(outside(), untouched);
     }
@@ -185,7 +195,12 @@ protected:
         settings.put("root", (folder / "place").native());
         provider.configure(settings);
         folder.write("place/own", "within");
+        struct stat status = {};
+        EXPECT_EQ(::stat((folder / "outside/who").c_str(), &status), 0);
+        inodeOutside = status.st_ino;
     }
+
+    std::uint64_t inodeOutside = 0;
 
     StorageIRI swapped(std::u16string const& name) const { return folder.iri(u"place/tree/swapped/" + name); }
 
@@ -217,8 +232,10 @@ protected:
             [this] {
                 EXPECT_NE(provider.existsExtended(swapped(u"known outside")), ExistenceTypeExtended::RegularFile);
             },
-            [this] { expectListedWithin(folder.iri(u"place/tree/swapped")); },
-            [this] { expectListedWithin(folder.iri(u"place")); },
+            [this] {
+                expectListedWithin(folder.iri(u"place"));
+                expectListedWithin(folder.iri(u"place/tree/swapped"));
+            },
             [this, write] { write(provider.openStream(swapped(u"written"), {})); },
             [this] {
                 auto const stream = provider.openTransactionalStream(swapped(u"who 2"), {});
@@ -232,7 +249,22 @@ protected:
             [this] { provider.removeFolder(swapped(u"made folder")); },
             [this] { provider.removeFolderRecursively(swapped(u"made folder")); },
             [this] { provider.removeFile(swapped(u"known outside")); },
-            [this] { provider.removeFolderRecursively(swapped(u"deep/known outside")); },
+            [this] { provider.removeFolderRecursively(swapped(u"folder outside")); },
+            [this] { provider.removeFolder(swapped(u"empty outside")); },
+            [this] { provider.moveFile(swapped(u"known outside"), swapped(u"gone"), ReplacementPolicy::Preserve); },
+            [this] { provider.getFolderAttributes(swapped(u"deep")); },
+            [this] {
+                auto const inode = provider.getExtendedAttributes(swapped(u"who")).getAttribute("inode");
+                EXPECT_NE(boost::any_cast<std::uint64_t>(inode), inodeOutside);
+            },
+            [this] {
+                provider.copyFileAtomic(swapped(u"who"), folder.iri(u"place/atomic copy"), ReplacementPolicy::Overwrite,
+                                        {});
+                EXPECT_EQ(folder.read("place/atomic copy"), "within");
+            },
+            [this] {
+                provider.copyFileAtomic(folder.iri(u"place/own"), swapped(u"copy 2"), ReplacementPolicy::Overwrite, {});
+            },
             [this] { provider.moveFile(folder.iri(u"place/own"), swapped(u"own"), ReplacementPolicy::Overwrite); },
             [this] { provider.moveFile(swapped(u"own"), folder.iri(u"place/own"), ReplacementPolicy::Overwrite); },
             [this] { provider.moveFolder(swapped(u"deep"), swapped(u"deep 2"), ReplacementPolicy::Preserve); },
@@ -243,6 +275,7 @@ protected:
             },
             [this] { provider.copyFile(folder.iri(u"place/own"), swapped(u"copy"), ReplacementPolicy::Overwrite); },
             [this] { provider.setLastModified(swapped(u"who"), boost::posix_time::from_time_t(1)); },
+            [this] { provider.setWritable(swapped(u"who"), false); },
             [this] { provider.setWritable(swapped(u"who"), true); },
         };
     }
@@ -252,18 +285,20 @@ TEST_F(LocalProviderConfinedSwapConcurrency, LeadsNoOperationOutside)
 {
     expectSwappingToMatter();
     auto const timeOutside = fs::last_write_time(folder / "outside/who");
-    std::map<bool, int> refused;
     auto const all = operations();
+    std::vector<int> refused(all.size());
+    std::uint64_t done = 0;
+    auto const isEachRefused = [&] { return std::count(refused.begin(), refused.end(), 0) == 0; };
     Swapper const swapper = swap();
-    auto const end = Clock::now() + 2 * duration;
-    while (!HasFailure() && (Clock::now() < end || refused[true] == 0 || refused[false] == 0)) {
-        ASSERT_LT(Clock::now(), end + patience) << refused[false] << " within, " << refused[true] << " refused";
-        for (auto const& operation : all) {
+    auto const end = Clock::now() + duration;
+    while (!HasFailure() && (Clock::now() < end || done == 0 || !isEachRefused())) {
+        ASSERT_LT(Clock::now(), end + patience) << done << " within; refused: " << testing::PrintToString(refused);
+        for (std::size_t i = 0; i < all.size(); ++i) {
             try {
-                operation();
-                ++refused[false];
+                all[i]();
+                ++done;
             } catch (Exception const& error) {
-                refused[true] += error.getErrorCode() == ErrorCode::PermissionDenied ? 1 : 0;
+                refused[i] += error.getErrorCode() == ErrorCode::PermissionDenied ? 1 : 0;
             } catch (ByteStreamFailure const&) {
                 // A stream may be closed when its file has been moved.
             }

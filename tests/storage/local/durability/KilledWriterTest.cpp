@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <storage/local/detail/scratchName.hpp>
+#include <storage/local/scratchFiles.hpp>
 #include <tests/storage/local/durability/SharedMemory.hpp>
 #include <tests/storage/local/durability/WrittenContent.hpp>
 #include <tests/storage/local/namelessFiles.hpp>
@@ -30,6 +31,7 @@ namespace {
 
 namespace fs = std::filesystem;
 using namespace provider;
+using namespace std::chrono_literals;
 using tests::support::madeContent;
 using tests::support::numberOfContent;
 using tests::support::SharedMemory;
@@ -126,7 +128,9 @@ TEST(KilledWriter, LeavesOldOrNewContentWholeAndNothingElseButScratchFiles)
                 continue;
             ASSERT_TRUE(detail::isScratchName(name)) << name;
             ++interrupted;
-            fs::remove(entry.path());
+            EXPECT_EQ(removeAbandonedScratchFile(folder.iri(std::u16string(name.begin(), name.end())), 0s),
+                      ScratchFileState::Abandoned);
+            EXPECT_FALSE(fs::exists(entry.path()));
         }
     }
     EXPECT_GT(acknowledged.load(), 0u) << "no writer got to the end of a write";

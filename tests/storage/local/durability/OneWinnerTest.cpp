@@ -93,13 +93,19 @@ protected:
         settings.put("durability", "none"); // Who wins is not a matter of the disk.
         provider.configure(settings);
         for (unsigned process = 0; process < processCount; ++process)
-            folder.write("source" + std::to_string(process), std::to_string(process));
-        folder.write("copied", "content");
+            for (char const* const name : {"source", "copied"})
+                folder.write(name + std::to_string(process), contentOf(process));
     }
 
-    static std::u16string sourceOf(unsigned process)
+    /// Its number, for every other one far behind a single write.
+    static std::string contentOf(unsigned process)
     {
-        std::string const name = "source" + std::to_string(process);
+        return std::string(process % 2 == 0 ? 0 : 65536, '.') + std::to_string(process);
+    }
+
+    static std::u16string nameOf(std::string const& prefix, unsigned process)
+    {
+        std::string const name = prefix + std::to_string(process);
         return std::u16string(name.begin(), name.end());
     }
 
@@ -110,11 +116,15 @@ protected:
 
     void create() const { provider.createFile(target); }
 
-    void move(unsigned process) const { provider.moveFile(folder.iri(sourceOf(process)), target, policyOf(process)); }
+    void move(unsigned process) const
+    {
+        provider.moveFile(folder.iri(nameOf("source", process)), target, policyOf(process));
+    }
 
     void copy(unsigned process) const
     {
-        auto const status = provider.copyFileAtomic(folder.iri(u"copied"), target, policyOf(process), {});
+        auto const status =
+            provider.copyFileAtomic(folder.iri(nameOf("copied", process)), target, policyOf(process), {});
         if (status != TransactionStatus::Completed)
             throw std::logic_error("a copy that was not aborted is not completed");
     }
@@ -149,15 +159,25 @@ protected:
         auto const& outcomes = meeting->outcomes;
         auto const winner = std::find(outcomes.begin(), outcomes.end(), Outcome::Won);
         long const losers = std::count(outcomes.begin(), outcomes.end(), Outcome::Lost);
-        bool const isGood = winner != outcomes.end() && losers == processCount - 1 && fs::exists(folder / "target");
+        auto const process = static_cast<unsigned>(winner - outcomes.begin());
+        bool const isGood = winner != outcomes.end() && losers == processCount - 1 && holdsContentOf(process, round);
         if (!isGood && ++badRounds == 1)
             ADD_FAILURE() << "round " << round << ": " << std::count(outcomes.begin(), outcomes.end(), Outcome::Won)
                           << " winners, " << losers << " losers";
         fs::remove(folder / "target");
-        auto const process = std::to_string(winner - outcomes.begin());
-        if (winner != outcomes.end() && !fs::exists(folder / ("source" + process)))
-            folder.write("source" + process, process);
+        std::string const source = "source" + std::to_string(process);
+        if (winner != outcomes.end() && !fs::exists(folder / source))
+            folder.write(source, contentOf(process));
     }
+
+    bool holdsContentOf(unsigned process, int round) const
+    {
+        return fs::exists(folder / "target") &&
+               folder.read("target") == (creates(process, round) ? "" : contentOf(process));
+    }
+
+    /// Whether a process makes an empty file rather than putting its content in place.
+    std::function<bool(unsigned process, int round)> creates = [](unsigned, int) { return false; };
 
     TemporaryFolder const folder;
     LocalProvider provider;
@@ -168,6 +188,7 @@ protected:
 
 TEST_F(OneWinnerAmongProcesses, CreatesAFile)
 {
+    creates = [](unsigned, int) { return true; };
     run([this](unsigned, int) { create(); });
 }
 
@@ -179,13 +200,15 @@ TEST_F(OneWinnerAmongProcesses, MovesItsFileThere)
 TEST_F(OneWinnerAmongProcesses, CopiesAFileThere)
 {
     run([this](unsigned process, int) { copy(process); });
-    EXPECT_EQ(std::distance(fs::directory_iterator(folder.path()), {}), processCount + 1) << "scratch files are left";
+    EXPECT_EQ(std::distance(fs::directory_iterator(folder.path()), {}), 2 * processCount) << "scratch files are left";
 }
 
 TEST_F(OneWinnerAmongProcesses, WinsAgainstOthersThatDoOtherwise)
 {
-    run([this](unsigned process, int round) {
-        switch ((process + static_cast<unsigned>(round)) % 3) {
+    auto const way = [](unsigned process, int round) { return (process + static_cast<unsigned>(round)) % 3; };
+    creates = [=](unsigned process, int round) { return way(process, round) == 0; };
+    run([this, way](unsigned process, int round) {
+        switch (way(process, round)) {
         case 0:
             return create();
         case 1:
