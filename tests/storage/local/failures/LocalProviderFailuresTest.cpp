@@ -10,6 +10,7 @@
 #include <tests/storage/local/failures/operations.hpp>
 
 #include <algorithm>
+#include <array>
 #include <fl/filesystem/native_name.hpp>
 #include <optional>
 #include <set>
@@ -202,6 +203,22 @@ TEST_P(LocalProviderFailures, AreNoneWhenCallsDoLessThanTheyCould)
     EXPECT_EQ(ending.leakedDescriptors, 0u);
     EXPECT_EQ(ending.found, well.found);
     EXPECT_EQ(ending.tree, well.tree);
+}
+
+TEST_P(LocalProviderFailures, AreNoneWhenOneCallDoesLessThanItCould)
+{
+    Ending const well = runWell();
+    for (SystemCall const& call : well.calls) {
+        constexpr std::array shortened{"read", "write", "copy_file_range", "getdents64"};
+        if (std::find(shortened.begin(), shortened.end(), call.name) == shortened.end())
+            continue;
+        SCOPED_TRACE(describe(call, 0));
+        Ending const ending = run(onlyCall(call.number, Fate::short_()));
+        EXPECT_EQ(ending.code, std::nullopt) << ending.place;
+        EXPECT_EQ(ending.leakedDescriptors, 0u);
+        EXPECT_EQ(ending.found, well.found);
+        EXPECT_EQ(ending.tree, well.tree);
+    }
 }
 
 INSTANTIATE_TEST_SUITE_P(Of, LocalProviderFailures,
