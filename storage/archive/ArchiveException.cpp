@@ -5,6 +5,7 @@
 
 #include <array>
 #include <ostream>
+#include <string>
 
 namespace foundation::storage::archive {
 
@@ -42,9 +43,35 @@ constexpr std::array rows{
         "the content is compressed more highly than allowed, as in an archive made to do harm"},
     Row{Reason::SpoolTooLarge, ErrorCode::FileTooLarge, "SpoolTooLarge",
         "the archive would have to be unpacked from another one, and is larger than allowed for that"},
+    Row{Reason::NotWritten, ErrorCode::IOError, "NotWritten", "the archive cannot be written, and stays as it was"},
     Row{Reason::StoreFailed, ErrorCode::IOError, "StoreFailed",
         "reading the archive failed in the store that holds it"},
 };
+
+/// Why a store did not take an archive.
+char const* describeRefusal(ErrorCode code)
+{
+    switch (code) {
+    case ErrorCode::NoSpaceLeft:
+        return "no space left";
+    case ErrorCode::PermissionDenied:
+        return "permission denied";
+    case ErrorCode::ReadOnlyProvider:
+        return "the store is read-only";
+    case ErrorCode::ResourceNotFound:
+        return "there is no folder to hold it";
+    case ErrorCode::InvalidLocation:
+        return "a name in it is too long";
+    default:
+        return "the store that holds it failed";
+    }
+}
+
+std::string wordsFor(Reason reason, ErrorCode code)
+{
+    std::string words = describe(reason);
+    return reason == Reason::NotWritten ? words + ": " + describeRefusal(code) : words;
+}
 
 Row const* find(Reason reason)
 {
@@ -76,7 +103,7 @@ ArchiveException::ArchiveException(Reason reason, StorageIRI const& location)
 ArchiveException::ArchiveException(Reason reason, ErrorCode code, StorageIRI const& location)
     : Exception(code, location), reason_(reason)
 {
-    *this << provider::ReasonInfo(fl::i18n::to_ustring(describe(reason)));
+    *this << provider::ReasonInfo(fl::i18n::to_ustring(wordsFor(reason, code)));
 }
 
 core::except::IException* ArchiveException::clone() const
@@ -96,7 +123,9 @@ char const* ArchiveException::what() const noexcept
 
 std::u16string ArchiveException::ToUstringImpl() const
 {
-    return u"Cannot read \"" + getStorageIRI().toString() + u"\": " + fl::i18n::to_ustring(describe(reason_)) + u'.';
+    char16_t const* const attempt = reason_ == Reason::NotWritten ? u"write" : u"read";
+    return std::u16string(u"Cannot ") + attempt + u" \"" + getStorageIRI().toString() + u"\": " +
+           fl::i18n::to_ustring(wordsFor(reason_, getErrorCode())) + u'.';
 }
 
 std::ostream& operator<<(std::ostream& stream, Reason const& reason)

@@ -8,7 +8,7 @@
 
 namespace foundation::storage::archive {
 
-/// An archive, or an entry of one, that cannot be read.
+/// An archive, or an entry of one, that cannot be read or written.
 ///
 /// The location is the container's where the archive as a whole is at fault, else the entry's. `what` is the class name
 /// alone; `ToUstringImpl` names the location and says why, and `ReasonInfo` holds the same words without it.
@@ -28,12 +28,13 @@ public:
         EntryTooLarge,     ///< `FileTooLarge`: beyond `ArchiveLimits::entryBytes`
         RatioTooHigh,      ///< `FileTooLarge`: beyond `ArchiveLimits::ratio`
         SpoolTooLarge,     ///< `FileTooLarge`: beyond `ArchiveLimits::spoolBytes`
+        NotWritten,        ///< the code of the store that holds the archive, which is as it was; changes are kept
         StoreFailed,       ///< the code of the store that holds the archive, or of the folder for temporary files
     };
 
     ArchiveException(Reason reason, provider::StorageIRI const& location);
 
-    /// With a code of its own, for `StoreFailed`.
+    /// With a code of its own, for `StoreFailed` and `NotWritten`.
     ArchiveException(Reason reason, provider::ErrorCode code, provider::StorageIRI const& location);
 
     Reason getReason() const { return reason_; }
@@ -47,7 +48,7 @@ private:
     Reason reason_;
 };
 
-/// The code that goes with a reason; `IOError` for `StoreFailed`.
+/// The code that goes with a reason; `IOError` for `StoreFailed` and `NotWritten`.
 FOUNDATION_API provider::ErrorCode errorCodeOf(ArchiveException::Reason reason);
 
 /// What happened, in words that may follow a location.

@@ -1,6 +1,8 @@
 #include <storage/archive/ArchiveProvider.hpp>
 
 #include <storage/archive/detail/MountedArchive.hpp>
+#include <storage/archive/detail/WritableArchive.hpp>
+#include <storage/provider/Exception.hpp>
 
 #include <utility>
 
@@ -10,12 +12,125 @@ using namespace provider;
 using detail::Depth;
 using detail::Detail;
 using detail::Entries;
+using detail::WritableArchive;
+
+namespace {
+
+std::shared_ptr<WritableArchive> mountWritable(ArchiveFormat format, StorageItem const& container,
+                                               ArchiveLimits const& limits)
+{
+    return format == ArchiveFormat::Zip ? std::make_shared<WritableArchive>(format, container, limits) : nullptr;
+}
+
+} // namespace
 
 ArchiveProvider::ArchiveProvider(ArchiveFormat format, StorageItem container, ArchiveLimits const& limits)
-    : archive_(std::make_unique<detail::MountedArchive>(format, std::move(container), limits))
+    : writable_(mountWritable(format, container, limits)),
+      archive_(writable_ != nullptr ? writable_
+                                    : std::make_shared<detail::MountedArchive>(format, std::move(container), limits))
 {}
 
 ArchiveProvider::~ArchiveProvider() = default;
+
+void ArchiveProvider::flush()
+{
+    if (writable_ != nullptr)
+        writable_->flush();
+}
+
+WritableArchive& ArchiveProvider::changeable(StorageIRI const& iri) const
+{
+    if (writable_ == nullptr)
+        throw Exception(ErrorCode::ReadOnlyProvider, iri);
+    return *writable_;
+}
+
+void ArchiveProvider::doCreateFile(StorageIRI const& iri) const
+{
+    changeable(iri).createFile(iri);
+}
+
+void ArchiveProvider::doCreateFolder(StorageIRI const& iri) const
+{
+    changeable(iri).createFolder(iri);
+}
+
+void ArchiveProvider::doCreateFolderRecursive(StorageIRI const& iri) const
+{
+    bool const isNew = changeable(iri).createArchive(iri);
+    if (!isNew || archive_->canonicalLocation(iri).getPath() != u"/")
+        IProvider::doCreateFolderRecursive(iri);
+}
+
+void ArchiveProvider::doRemoveFile(StorageIRI const& iri) const
+{
+    changeable(iri).removeFile(iri);
+}
+
+void ArchiveProvider::doRemoveFolder(StorageIRI const& iri) const
+{
+    changeable(iri).removeFolder(iri, WritableArchive::Removal::EmptyFolder);
+}
+
+void ArchiveProvider::doRemoveFolderRecursively(StorageIRI const& iri) const
+{
+    changeable(iri).removeFolder(iri, WritableArchive::Removal::FolderAndContents);
+}
+
+void ArchiveProvider::doMoveFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
+{
+    changeable(from).moveFile(from, to, policy);
+}
+
+void ArchiveProvider::doMoveFolder(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
+{
+    changeable(from).moveFolder(from, to, policy);
+}
+
+void ArchiveProvider::doCopyFile(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy const& policy) const
+{
+    changeable(from).copyFile(from, to, policy);
+}
+
+TransactionStatus ArchiveProvider::doCopyFileAtomic(StorageIRI const& from, StorageIRI const& to,
+                                                    ReplacementPolicy const& policy, Interrupt const& interrupt) const
+{
+    if (writable_ == nullptr)
+        return IProvider::doCopyFileAtomic(from, to, policy, interrupt);
+    return writable_->copyFileAtomic(from, to, policy, interrupt);
+}
+
+void ArchiveProvider::doSetLastModified(StorageIRI const& iri, boost::posix_time::ptime const& time) const
+{
+    changeable(iri).setLastModified(iri, time);
+}
+
+void ArchiveProvider::doSetWritable(StorageIRI const& iri, bool writable) const
+{
+    changeable(iri);
+    IProvider::doSetWritable(iri, writable);
+}
+
+std::unique_ptr<ByteStream> ArchiveProvider::doOpenStream(StorageIRI const& iri,
+                                                          ByteStreamOpenOptions const& options) const
+{
+    return changeable(iri).openForWriting(iri, options);
+}
+
+std::unique_ptr<TransactionalStream>
+ArchiveProvider::doOpenTransactionalStream(StorageIRI const& iri, ByteStreamOpenOptions const& options) const
+{
+    if (writable_ == nullptr)
+        return IProvider::doOpenTransactionalStream(iri, options);
+    return writable_->openTransaction(iri, options);
+}
+
+bool ArchiveProvider::doHasFeature(ExtendedFeature const& feature) const
+{
+    bool const isOfChanges =
+        feature == ExtendedFeature::RecursiveFolderRemoval || feature == ExtendedFeature::AtomicFileCopy;
+    return isOfChanges && writable_ != nullptr;
+}
 
 bool ArchiveProvider::doFileExists(StorageIRI const& iri) const
 {
@@ -64,6 +179,7 @@ StorageIRI ArchiveProvider::doGetCanonicalLocation(StorageIRI const& iri) const
 
 void ArchiveProvider::doShutdown()
 {
+    flush();
     archive_->release();
 }
 

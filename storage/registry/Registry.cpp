@@ -77,8 +77,10 @@ auto withholdingSettings(StorageIRI const& location, HasSettings const& hasSetti
     }
 }
 
-/// Does something for several factories in turn, and throws the first failure at the end.
-class Visit
+} // namespace
+
+/// Does something for several factories or providers in turn, and throws the first failure at the end.
+class Registry::Visit
 {
 public:
     template <typename Action>
@@ -102,6 +104,8 @@ private:
     std::exception_ptr first_;
 };
 
+namespace {
+
 std::shared_ptr<IProvider> requireProvider(std::shared_ptr<IProvider> provider, StorageIRI const& location)
 {
     if (provider == nullptr)
@@ -110,7 +114,7 @@ std::shared_ptr<IProvider> requireProvider(std::shared_ptr<IProvider> provider, 
 }
 
 /// The provider of a container's inside, which need not hold the container by itself, and goes before it.
-struct Inside
+struct InsideAndContainer
 {
     StorageItem container;
     std::shared_ptr<IProvider> provider;
@@ -118,7 +122,7 @@ struct Inside
 
 std::shared_ptr<IProvider> keepingContainer(std::shared_ptr<IProvider> provider, StorageItem const& container)
 {
-    auto const inside = std::make_shared<Inside>(Inside{container, std::move(provider)});
+    auto const inside = std::make_shared<InsideAndContainer>(InsideAndContainer{container, std::move(provider)});
     return std::shared_ptr<IProvider>(inside, inside->provider.get());
 }
 
@@ -172,11 +176,36 @@ StorageItem Registry::open(StorageIRI const& location) const
     for (auto level = levels.rbegin() + 1; level != levels.rend(); ++level) {
         item = withholdingSettings(level->location, hasSettings, [&] {
             auto const& factory = std::get<Container>(level->entry.factory);
-            return StorageItem(keepingContainer(requireProvider(factory->buildProvider(item), level->location), item),
-                               level->location);
+            auto inside = requireProvider(factory->buildProvider(item), level->location);
+            remember(inside, *level, static_cast<std::size_t>(level - levels.rbegin()));
+            return StorageItem(keepingContainer(std::move(inside), item), level->location);
         });
     }
     return item;
+}
+
+void Registry::remember(std::shared_ptr<IProvider> const& inside, Level const& level, std::size_t depth) const
+{
+    std::lock_guard const lock(mutex_);
+    insides_.insert_or_assign(inside.get(), Inside{inside, level.location, depth});
+    if (insides_.size() < insidesToTidy_)
+        return;
+    std::erase_if(insides_, [](auto const& entry) { return entry.second.provider.expired(); });
+    insidesToTidy_ = 2 * insides_.size() + 64;
+}
+
+std::vector<Registry::Inside> Registry::insidesFromWithin() const
+{
+    std::vector<Inside> insides;
+    {
+        std::lock_guard const lock(mutex_);
+        for (auto const& entry : insides_)
+            insides.push_back(entry.second);
+    }
+    std::sort(insides.begin(), insides.end(), [](Inside const& a, Inside const& b) {
+        return a.depth != b.depth ? a.depth > b.depth : a.location < b.location;
+    });
+    return insides;
 }
 
 void Registry::refusePassword(std::u16string const& text) const
@@ -273,23 +302,42 @@ std::u16string const& Registry::requireConfigurable(std::string const& key) cons
     return scheme;
 }
 
+void Registry::flush()
+{
+    Visit visit;
+    for (Inside const& inside : insidesFromWithin()) {
+        if (std::shared_ptr<IProvider> const provider = inside.provider.lock())
+            visit.attempt([&] { provider->shutdown(); });
+    }
+    visit.finish();
+}
+
 void Registry::shutdown()
 {
     Visit visit;
-    for (SchemeKind const kind : {SchemeKind::Container, SchemeKind::Physical}) {
-        for (auto const& served : entries_) {
-            if (served.second.kind() == kind)
-                visit.attempt([&] { shutdownScheme(served.first, served.second); });
-        }
+    for (Inside const& inside : insidesFromWithin()) {
+        if (std::shared_ptr<IProvider> const provider = inside.provider.lock())
+            visit.attempt([&] { shutdownInside(inside, *provider); });
+    }
+    for (auto const& served : entries_) {
+        if (served.second.kind() == SchemeKind::Physical)
+            visit.attempt([&] { shutdownScheme(served.first, served.second); });
     }
     visit.finish();
+}
+
+void Registry::shutdownInside(Inside const& inside, IProvider& provider)
+{
+    std::u16string const scheme = detail::lowerCased(inside.location.getScheme());
+    withholdingSettings(
+        rootOf(scheme), [&] { return mayRepeatSettings(entries_.at(scheme)); }, [&] { provider.shutdown(); });
 }
 
 void Registry::shutdownScheme(std::u16string const& scheme, Entry const& entry)
 {
     withholdingSettings(
         rootOf(scheme), [&] { return mayRepeatSettings(entry); },
-        [&] { std::visit([](auto const& factory) { factory->shutdownProvider(); }, entry.factory); });
+        [&] { std::get<Physical>(entry.factory)->shutdownProvider(); });
 }
 
 /// Containers may lie in any store, and pass on what it says.

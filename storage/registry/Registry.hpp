@@ -12,6 +12,7 @@
 #include <atomic>
 #include <map>
 #include <memory>
+#include <mutex>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -33,8 +34,8 @@ namespace foundation::storage::registry {
 ///
 /// Ownership: shares the factories, keeps no provider alive. Items keep all they need, the providers of the containers
 /// they lie in included, and may outlive the registry.
-/// Threads: `open`, `schemes`, `configure` and `shutdown` may be used from any number of threads at once, `add` by
-/// nobody beside.
+/// Threads: `open`, `schemes`, `configure`, `flush` and `shutdown` may be used from any number of threads at once,
+/// `add` by nobody beside.
 class FOUNDATION_API Registry
 {
 public:
@@ -73,8 +74,13 @@ public:
     /// none of the others; the first failure is thrown when all were visited, as `FactoryException`.
     void configure(boost::property_tree::ptree const& settings);
 
-    /// Shuts down every live provider, those of containers first. A failing factory stops none of the others; the first
-    /// failure is thrown when all were visited. What is opened later works as ever.
+    /// Has every live provider of a container that was opened here write what is pending, the innermost containers
+    /// first, since they write into those round them. A failure stops none of the others; the first one is thrown at
+    /// the end, unchanged, as from an operation of an opened item. All of them can be used on.
+    void flush();
+
+    /// Does what `flush` does and shuts down every other live provider after that. A failing factory stops none of the
+    /// others; the first failure is thrown when all were visited. What is opened later works as ever.
     void shutdown();
 
 private:
@@ -93,12 +99,22 @@ private:
     };
     using Entries = std::map<std::u16string, Entry>;
 
+    /// The provider of a container's inside, which may be gone by now.
+    struct Inside
+    {
+        std::weak_ptr<provider::IProvider> provider;
+        provider::StorageIRI location;
+        std::size_t depth; ///< how many containers lie round the place
+    };
+
     /// A location, and who serves it.
     struct Level
     {
         provider::StorageIRI location;
         Entry const& entry;
     };
+
+    class Visit;
 
     void addFactory(std::u16string const& scheme, Factory factory);
     void refusePassword(std::u16string const& text) const;
@@ -108,10 +124,16 @@ private:
     Entry const& find(std::u16string_view scheme, SchemeKind kind, provider::StorageIRI const& location) const;
     std::u16string const& requireConfigurable(std::string const& key) const;
     void configureScheme(std::u16string const& scheme, boost::property_tree::ptree const& settings);
+    void shutdownInside(Inside const& inside, provider::IProvider& provider);
     void shutdownScheme(std::u16string const& scheme, Entry const& entry);
     bool mayRepeatSettings(Entry const& entry) const;
+    void remember(std::shared_ptr<provider::IProvider> const& inside, Level const& level, std::size_t depth) const;
+    std::vector<Inside> insidesFromWithin() const;
 
     Entries entries_;
+    mutable std::mutex mutex_;
+    mutable std::map<provider::IProvider const*, Inside> insides_;
+    mutable std::size_t insidesToTidy_ = 64; ///< so many that those which are gone are looked for
 };
 
 } // namespace foundation::storage::registry

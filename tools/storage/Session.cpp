@@ -1,5 +1,6 @@
 #include <tools/storage/Session.hpp>
 
+#include <tools/storage/interrupt.hpp>
 #include <tools/storage/printable.hpp>
 
 #include <cerrno>
@@ -31,6 +32,15 @@ void Session::complain(Failure const& failure)
     progress_.erase();
     output_.flush();
     writeError(command_, fmt::format("{}: {}", printable(failure.location), printable(failure.reason)));
+}
+
+void Session::finishWork()
+{
+    if (!stores_.hasArchives())
+        return;
+    checkInterrupt();
+    attempt([&] { stores_.writeArchives(); });
+    progress_.erase();
 }
 
 void writeError(std::string_view command, std::string_view text)

@@ -38,6 +38,10 @@ public:
     /// Writes "storage: COMMAND: LOCATION: REASON" to standard error; the command has failed.
     void complain(Failure const& failure);
 
+    /// Ends the work: what was changed in archives is written into them, unless the user has asked to stop by then. A
+    /// failure is complained about. Throws `Interrupted`.
+    void finishWork();
+
     /// Calls `action`, and complains about a failure so that the rest can be done. Answers whether there was none.
     template <typename Action>
     bool attempt(Action&& action)

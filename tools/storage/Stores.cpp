@@ -11,6 +11,7 @@
 #include <tools/storage/explain.hpp>
 #include <tools/storage/schemeText.hpp>
 
+#include <algorithm>
 #include <cerrno>
 #include <fmt/format.h>
 #include <memory>
@@ -130,7 +131,9 @@ provider::StorageItem Stores::openItem(std::string const& argument) const
         return registry_.open(locationOfPath(argument));
     std::string const shown = withoutPassword(argument);
     try {
-        return registry_.open(textOfIRI(argument));
+        provider::StorageItem item = registry_.open(textOfIRI(argument));
+        keep(item);
+        return item;
     } catch (OpenException const& error) {
         throw Failure{shown, explain(error, shown)};
     } catch (provider::Exception const& error) {
@@ -139,6 +142,35 @@ provider::StorageItem Stores::openItem(std::string const& argument) const
         throw;
     } catch (std::exception const& error) {
         throw Failure{shown, fmt::format("not a location: {} (for a local path, write ./{})", error.what(), shown)};
+    }
+}
+
+/// One item keeps the provider of its container, and of those round it.
+void Stores::keep(provider::StorageItem const& item) const
+{
+    if (!item.getLocation().hasInnerIRI())
+        return;
+    std::lock_guard const lock(mutex_);
+    bool const isKept = std::any_of(kept_.begin(), kept_.end(), [&](provider::StorageItem const& other) {
+        return other.hasSameProviderInstance(item);
+    });
+    if (!isKept)
+        kept_.push_back(item);
+}
+
+bool Stores::hasArchives() const
+{
+    std::lock_guard const lock(mutex_);
+    return !kept_.empty();
+}
+
+void Stores::writeArchives()
+{
+    try {
+        registry_.flush();
+    } catch (provider::Exception const& error) {
+        throw Failure{fl::i18n::to_utf8(error.getStorageIRI().toString(), fl::i18n::Malformed::Replace),
+                      tool::explain(error)};
     }
 }
 

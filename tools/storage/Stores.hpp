@@ -5,7 +5,9 @@
 #include <tools/storage/Place.hpp>
 
 #include <boost/property_tree/ptree.hpp>
+#include <mutex>
 #include <string>
+#include <vector>
 
 namespace foundation::storage::tool {
 
@@ -35,13 +37,23 @@ public:
     /// The item at a location that was not written by a user.
     provider::StorageItem itemAt(provider::StorageIRI const& location) const { return registry_.open(location); }
 
+    /// Whether a place in an archive was opened.
+    bool hasArchives() const;
+
+    /// Has what was changed in archives written into them, the innermost first. Throws `Failure` that names the
+    /// archive. What is not written by then is lost with the stores.
+    void writeArchives();
+
     Place open(std::string const& argument) const { return Place(openItem(argument), argument); }
 
 private:
+    void keep(provider::StorageItem const& item) const;
     void set(char const* setting, char const* value);
 
     boost::property_tree::ptree settings_;
     registry::Registry registry_;
+    mutable std::mutex mutex_;
+    mutable std::vector<provider::StorageItem> kept_; ///< whose stores hold what is not written yet
 };
 
 } // namespace foundation::storage::tool

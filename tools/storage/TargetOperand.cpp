@@ -8,7 +8,7 @@
 namespace foundation::storage::tool {
 
 TargetOperand::TargetOperand(Place place, std::size_t sourceCount)
-    : place_(std::move(place)), isFolder_(leadsToFolder(kindOf(place_)))
+    : place_(std::move(place)), isFolder_(leadsToFolder(kindOf(place_)) || isRootOfMissingArchive(place_))
 {
     if (isFolder_)
         return;

@@ -24,10 +24,21 @@ void requireKindAsSaid(Place const& place, Kind kind)
         throw Failure{place.text(), "not a folder, as the slash at the end says"};
 }
 
+bool isRootOfMissingArchive(Place const& place)
+{
+    if (!place.item().getLocation().hasInnerIRI() || kindOf(place) != Kind::None)
+        return false;
+    return at(place, [&] { return place.item().getCanonicalLocation().getPath() == u"/"; });
+}
+
 void requireParentFolder(Place const& place)
 {
-    if (!place.item().hasParent() || !leadsToFolder(kindOf(Place(place.item().getParent(), place.text()))))
-        throw Failure{place.text(), "there is no folder to hold it"};
+    if (place.item().hasParent()) {
+        Place const parent(place.item().getParent(), place.text());
+        if (leadsToFolder(kindOf(parent)) || isRootOfMissingArchive(parent))
+            return;
+    }
+    throw Failure{place.text(), "there is no folder to hold it"};
 }
 
 char const* kindName(Kind kind)

@@ -16,6 +16,9 @@ Kind existingKindOf(Place const& place);
 /// Throws `Failure` for anything but a folder at a place that says that it is one: `a/` is not the file `a`.
 void requireKindAsSaid(Place const& place, Kind kind);
 
+/// Whether a place is the root of an archive that is not there. It comes to be with the first thing in it.
+bool isRootOfMissingArchive(Place const& place);
+
 /// Throws `Failure` unless the folder is there that holds the place, or is to hold it.
 void requireParentFolder(Place const& place);
 

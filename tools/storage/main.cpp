@@ -77,11 +77,16 @@ int runCommand(std::string const& name, Action const& action)
         Session session(name);
         try {
             action(session);
+        } catch (Interrupted const&) {
+            session.output().flush();
+            throw;
         } catch (...) {
             // What was done up to here has been done.
+            session.finishWork();
             session.output().flush();
             throw;
         }
+        session.finishWork();
         session.output().flush();
         return session.status();
     });

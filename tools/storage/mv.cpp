@@ -97,7 +97,10 @@ void requireCopied(Place const& source, Place const& copy, ptime const& start)
 /// What is moved there would be lost: the source is removed, and the copy goes with the command.
 void requireLasting(Place const& target)
 {
-    if (target.item().getScheme() == u"mem")
+    provider::StorageIRI store = target.item().getLocation();
+    while (store.hasInnerIRI())
+        store = store.getInnerIRI();
+    if (store.getScheme() == u"mem")
         throw Failure{target.text(), "goes when the command ends, so that nothing is moved there"};
 }
 
@@ -258,6 +261,7 @@ bool Move::moveFileByCopying(Place const& source, Place const& target)
     run_.copyFile(source, target, TargetState::Unknown);
     if (!run_.finish())
         return false;
+    session_.stores().writeArchives(); // the source must not go before its copy is there to stay
     requireCopied(source, target, start);
     at(source, [&] { source.item().removeFile(); });
     return true;
@@ -269,6 +273,7 @@ void Move::moveFolderByCopying(Place const& source, Place const& target)
     trees_.copy(source, target);
     if (!run_.finish())
         throw Failure{source.text(), "stays, because not all of it could be copied; what could is in " + target.text()};
+    session_.stores().writeArchives();
     TreeRemover(session_).remove(source, target,
                                  [&](Place const& file, Place const& copy) { requireCopied(file, copy, start); });
     if (kindOf(source) != Kind::None)

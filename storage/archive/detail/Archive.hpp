@@ -31,6 +31,9 @@ public:
     /// Whether content can be read at any place at once.
     virtual bool isRandomAccess(Index::Id file) const = 0;
 
+    /// Whether archives of this format can be changed.
+    virtual bool isWritable() const { return false; }
+
 protected:
     Index index_;
     bool isIncomplete_ = false;

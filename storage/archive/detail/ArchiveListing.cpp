@@ -11,14 +11,14 @@ using provider::FileAttributes;
 using provider::FolderAttributes;
 using provider::FolderEntry;
 
-FileAttributes fileAttributes(Node const& node)
+FileAttributes fileAttributes(Node const& node, bool isWritable)
 {
-    return FileAttributes(node.size, toPtime(node.modified), false);
+    return FileAttributes(node.size, toPtime(node.modified), isWritable);
 }
 
-FolderAttributes folderAttributes(Node const& node)
+FolderAttributes folderAttributes(Node const& node, bool isWritable)
 {
-    return FolderAttributes(toPtime(node.modified), false);
+    return FolderAttributes(toPtime(node.modified), isWritable);
 }
 
 ArchiveListing::ArchiveListing(std::shared_ptr<Archive const> archive, provider::StorageIRI const& container,
@@ -105,8 +105,8 @@ FolderEntry ArchiveListing::makeEntry() const
     if (selection_.detail == Detail::NamesOnly)
         return {std::move(path), isFolder ? FolderEntry::EntryType::Folder : FolderEntry::EntryType::File};
     if (isFolder)
-        return {std::move(path), folderAttributes(node)};
-    return {std::move(path), fileAttributes(node)};
+        return {std::move(path), folderAttributes(node, archive_->isWritable())};
+    return {std::move(path), fileAttributes(node, archive_->isWritable())};
 }
 
 } // namespace foundation::storage::archive::detail

@@ -41,8 +41,8 @@ struct Selection
 };
 
 /// The attributes of an entry that is no link.
-FOUNDATION_API provider::FileAttributes fileAttributes(Node const& node);
-FOUNDATION_API provider::FolderAttributes folderAttributes(Node const& node);
+FOUNDATION_API provider::FileAttributes fileAttributes(Node const& node, bool isWritable);
+FOUNDATION_API provider::FolderAttributes folderAttributes(Node const& node, bool isWritable);
 
 /// A folder of an archive, in the order of the archive, which is the fastest to read it in.
 ///

@@ -25,10 +25,14 @@ enum class EntryKind : std::uint8_t
 struct Node
 {
     static constexpr std::uint32_t none = std::numeric_limits<std::uint32_t>::max();
+    static constexpr std::uint64_t noLocator = std::numeric_limits<std::uint64_t>::max();
 
     std::uint64_t size = 0;    ///< bytes of content
     std::int64_t modified = 0; ///< microseconds since 1970, UTC
-    std::uint64_t locator = 0; ///< where the archive has the content, as its format counts
+
+    /// Where the archive has the content, as its format counts. A folder that only paths name has none.
+    std::uint64_t locator = noLocator;
+
     std::uint32_t parent = 0;
     std::uint32_t firstChild = none;
     std::uint32_t lastChild = none;
@@ -89,6 +93,7 @@ public:
 
 private:
     friend class IndexBuilder;
+    friend class PendingTree;
 
     struct Walk
     {

@@ -56,6 +56,8 @@ MountedArchive::MountedArchive(ArchiveFormat format, StorageItem container, Arch
         throw ArchiveException(Reason::NestedTooDeep, location_);
 }
 
+MountedArchive::~MountedArchive() = default;
+
 void MountedArchive::requireInside(StorageIRI const& iri) const
 {
     if (!iri.hasInnerIRI())
@@ -84,15 +86,41 @@ MountedArchive::ArchivePtr MountedArchive::upToDateArchive() const
     return archive_ != nullptr && stamp_ == stamp ? archive_ : openLocked(stamp);
 }
 
-/// Nothing where the container is not there.
-MountedArchive::ArchivePtr MountedArchive::existingArchive() const
+std::optional<MountedArchive::Stamp> MountedArchive::currentStamp() const
 {
     try {
-        return archive();
+        return stampOfContainer();
     } catch (Exception const& error) {
         if (error.getErrorCode() != ErrorCode::ResourceNotFound)
             throw;
-        return nullptr;
+        return std::nullopt;
+    }
+}
+
+MountedArchive::Version MountedArchive::currentVersion() const
+{
+    std::lock_guard const lock(mutex_);
+    auto const stamp = currentStamp();
+    if (!stamp)
+        return {};
+    return {archive_ != nullptr && stamp_ == stamp ? archive_ : openLocked(*stamp), stamp};
+}
+
+MountedArchive::View MountedArchive::view() const
+{
+    ArchivePtr archive = this->archive();
+    Index const* const index = &archive->index();
+    return {std::move(archive), index};
+}
+
+MountedArchive::View MountedArchive::existingView() const
+{
+    try {
+        return view();
+    } catch (Exception const& error) {
+        if (error.getErrorCode() != ErrorCode::ResourceNotFound)
+            throw;
+        return {};
     }
 }
 
@@ -111,30 +139,30 @@ void MountedArchive::release()
     gone = std::move(archive_);
 }
 
-Index::Id MountedArchive::require(Archive const& archive, StorageIRI const& iri) const
+Index::Id MountedArchive::require(View const& view, StorageIRI const& iri) const
 {
-    Index::Place const place = archive.index().find(iri.getPath(), LastLink::Follow);
+    Index::Place const place = view.index->find(iri.getPath(), LastLink::Follow);
     if (place.isLoop)
         throw Exception(ErrorCode::InvalidLocation, iri);
-    if (!place.id && archive.isIncomplete())
+    if (!place.id && view.archive != nullptr && view.archive->isIncomplete())
         throw ArchiveException(Reason::Damaged, location_);
-    if (!place.id || archive.index().at(*place.id).kind == EntryKind::HardLink)
+    if (!place.id || view.index->at(*place.id).kind == EntryKind::HardLink)
         throw Exception(ErrorCode::ResourceNotFound, iri);
     return *place.id;
 }
 
-Index::Id MountedArchive::requireFile(Archive const& archive, StorageIRI const& iri) const
+Index::Id MountedArchive::requireFile(View const& view, StorageIRI const& iri) const
 {
-    Index::Id const id = require(archive, iri);
-    if (archive.index().at(id).kind == EntryKind::Folder)
+    Index::Id const id = require(view, iri);
+    if (view.index->at(id).kind == EntryKind::Folder)
         throw Exception(ErrorCode::ResourceNotFound, iri);
     return id;
 }
 
-Index::Id MountedArchive::requireFolder(Archive const& archive, StorageIRI const& iri) const
+Index::Id MountedArchive::requireFolder(View const& view, StorageIRI const& iri) const
 {
-    Index::Id const id = require(archive, iri);
-    if (archive.index().at(id).kind != EntryKind::Folder)
+    Index::Id const id = require(view, iri);
+    if (view.index->at(id).kind != EntryKind::Folder)
         throw Exception(ErrorCode::ResourceNotFound, iri);
     return id;
 }
@@ -142,25 +170,25 @@ Index::Id MountedArchive::requireFolder(Archive const& archive, StorageIRI const
 ExistenceType MountedArchive::exists(StorageIRI const& iri) const
 {
     requireInside(iri);
-    ArchivePtr const archive = existingArchive();
-    if (archive == nullptr)
+    View const view = existingView();
+    if (view.index == nullptr)
         return ExistenceType::AsNeither;
-    auto const id = archive->index().find(iri.getPath(), LastLink::Follow).id;
-    if (!id || archive->index().at(*id).kind == EntryKind::HardLink)
+    auto const id = view.index->find(iri.getPath(), LastLink::Follow).id;
+    if (!id || view.index->at(*id).kind == EntryKind::HardLink)
         return ExistenceType::AsNeither;
-    return archive->index().at(*id).kind == EntryKind::Folder ? ExistenceType::AsFolder : ExistenceType::AsFile;
+    return view.index->at(*id).kind == EntryKind::Folder ? ExistenceType::AsFolder : ExistenceType::AsFile;
 }
 
 ExistenceTypeExtended MountedArchive::existsExtended(StorageIRI const& iri) const
 {
     requireInside(iri);
-    ArchivePtr const archive = existingArchive();
-    if (archive == nullptr)
+    View const view = existingView();
+    if (view.index == nullptr)
         return ExistenceTypeExtended::None;
-    auto const id = archive->index().find(iri.getPath(), LastLink::Keep).id;
+    auto const id = view.index->find(iri.getPath(), LastLink::Keep).id;
     if (!id)
         return ExistenceTypeExtended::None;
-    switch (archive->index().at(*id).kind) {
+    switch (view.index->at(*id).kind) {
     case EntryKind::Folder:
         return ExistenceTypeExtended::RegularFolder;
     case EntryKind::File:
@@ -168,7 +196,7 @@ ExistenceTypeExtended MountedArchive::existsExtended(StorageIRI const& iri) cons
     case EntryKind::Special:
         return ExistenceTypeExtended::SpecialFile;
     case EntryKind::SymbolicLink:
-        return typeOfTarget(archive->index(), *id);
+        return typeOfTarget(*view.index, *id);
     case EntryKind::HardLink:
         break;
     }
@@ -178,22 +206,23 @@ ExistenceTypeExtended MountedArchive::existsExtended(StorageIRI const& iri) cons
 FileAttributes MountedArchive::fileAttributes(StorageIRI const& iri) const
 {
     requireInside(iri);
-    ArchivePtr const archive = this->archive();
-    return detail::fileAttributes(archive->index().at(requireFile(*archive, iri)));
+    View const view = this->view();
+    return detail::fileAttributes(view.index->at(requireFile(view, iri)), view.archive->isWritable());
 }
 
 FolderAttributes MountedArchive::folderAttributes(StorageIRI const& iri) const
 {
     requireInside(iri);
-    ArchivePtr const archive = this->archive();
-    return detail::folderAttributes(archive->index().at(requireFolder(*archive, iri)));
+    View const view = this->view();
+    bool const isWritable = view.archive == nullptr || view.archive->isWritable();
+    return detail::folderAttributes(view.index->at(requireFolder(view, iri)), isWritable);
 }
 
 ExtendedAttributes MountedArchive::extendedAttributes(StorageIRI const& iri) const
 {
     requireInside(iri);
     ArchivePtr const archive = this->archive();
-    Index::Id const id = require(*archive, iri);
+    Index::Id const id = require({archive, &archive->index()}, iri);
     if (archive->index().at(id).kind != EntryKind::File)
         return {};
     std::string const access = archive->isRandomAccess(id) ? randomAccess : sequentialAccess;
@@ -204,7 +233,7 @@ std::unique_ptr<ByteStream> MountedArchive::open(StorageIRI const& iri) const
 {
     requireInside(iri);
     ArchivePtr const archive = this->archive();
-    Index::Id const id = requireFile(*archive, iri);
+    Index::Id const id = requireFile({archive, &archive->index()}, iri);
     Node const& node = archive->index().at(id);
     if (node.kind != EntryKind::File)
         throw Exception(ErrorCode::UnsupportedOperation, iri);
@@ -215,7 +244,7 @@ IProvider::Listing MountedArchive::list(StorageIRI const& folder, Selection sele
 {
     requireInside(folder);
     ArchivePtr archive = upToDateArchive();
-    Index::Id const id = requireFolder(*archive, folder);
+    Index::Id const id = requireFolder({archive, &archive->index()}, folder);
     return std::make_unique<ArchiveListing>(std::move(archive), location_, id, std::move(selection));
 }
 

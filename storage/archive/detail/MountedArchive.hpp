@@ -17,7 +17,7 @@
 
 namespace foundation::storage::archive::detail {
 
-/// The locations in one container, and what is there.
+/// The locations in one container, and what is there, for reading.
 ///
 /// The index is read when it is first needed, and again when a listing begins and the container has changed since.
 /// Errors: `Exception` that names the container where that is at fault, else the location.
@@ -26,22 +26,25 @@ class FOUNDATION_API MountedArchive
 {
 public:
     MountedArchive(ArchiveFormat format, provider::StorageItem container, ArchiveLimits const& limits);
+    MountedArchive(MountedArchive const&) = delete;
+    MountedArchive& operator=(MountedArchive const&) = delete;
+    virtual ~MountedArchive();
 
     /// Without a container there is nothing.
     provider::ExistenceType exists(provider::StorageIRI const& iri) const;
     provider::ExistenceTypeExtended existsExtended(provider::StorageIRI const& iri) const;
 
-    provider::FileAttributes fileAttributes(provider::StorageIRI const& iri) const;
+    virtual provider::FileAttributes fileAttributes(provider::StorageIRI const& iri) const;
     provider::FolderAttributes folderAttributes(provider::StorageIRI const& iri) const;
-    provider::ExtendedAttributes extendedAttributes(provider::StorageIRI const& iri) const;
-    std::unique_ptr<provider::ByteStream> open(provider::StorageIRI const& iri) const;
-    provider::IProvider::Listing list(provider::StorageIRI const& folder, Selection selection) const;
+    virtual provider::ExtendedAttributes extendedAttributes(provider::StorageIRI const& iri) const;
+    virtual std::unique_ptr<provider::ByteStream> open(provider::StorageIRI const& iri) const;
+    virtual provider::IProvider::Listing list(provider::StorageIRI const& folder, Selection selection) const;
     provider::StorageIRI canonicalLocation(provider::StorageIRI const& iri) const;
 
     /// Lets go of the archive, until it is used again. Streams and listings keep what they have.
     void release();
 
-private:
+protected:
     using ArchivePtr = std::shared_ptr<Archive const>;
 
     /// What tells a container from a changed one.
@@ -53,15 +56,44 @@ private:
         bool operator==(Stamp const&) const = default;
     };
 
+    /// An archive and the moment of its container at which it was opened; neither where there is no container.
+    struct Version
+    {
+        ArchivePtr archive;
+        std::optional<Stamp> stamp;
+    };
+
+    /// What is to be looked at, and how long it stays as it is: for ever, or as long as the lock is held.
+    struct View
+    {
+        ArchivePtr archive; ///< from which entries have their content; nothing without a container
+        Index const* index = nullptr;
+        std::unique_lock<std::mutex> lock = {};
+    };
+
+    /// Throws where the container is not there.
+    virtual View view() const;
+
+    /// Without an index where the container is not there.
+    View existingView() const;
+
     void requireInside(provider::StorageIRI const& iri) const;
+    provider::StorageItem const& container() const { return container_; }
+    provider::StorageIRI const& location() const { return location_; }
+    ArchiveLimits const& limits() const { return limits_; }
+
+    Version currentVersion() const;
+    std::optional<Stamp> currentStamp() const;
+
+    Index::Id require(View const& view, provider::StorageIRI const& iri) const;
+    Index::Id requireFile(View const& view, provider::StorageIRI const& iri) const;
+    Index::Id requireFolder(View const& view, provider::StorageIRI const& iri) const;
+
+private:
     Stamp stampOfContainer() const;
     ArchivePtr archive() const;
     ArchivePtr upToDateArchive() const;
-    ArchivePtr existingArchive() const;
     ArchivePtr const& openLocked(Stamp const& stamp) const;
-    Index::Id require(Archive const& archive, provider::StorageIRI const& iri) const;
-    Index::Id requireFile(Archive const& archive, provider::StorageIRI const& iri) const;
-    Index::Id requireFolder(Archive const& archive, provider::StorageIRI const& iri) const;
 
     ArchiveFormat const format_;
     provider::StorageItem const container_;

@@ -2,16 +2,17 @@
 
 #include <foundation/export.hpp>
 #include <storage/archive/detail/Source.hpp>
+#include <storage/archive/detail/TemporaryFile.hpp>
 
 #include <cstdint>
+#include <memory>
 #include <vector>
 
 namespace foundation::storage::archive::detail {
 
 /// A copy of a stream that can be read only from its beginning to its end.
 ///
-/// It is kept in memory up to a limit, and beyond that in a file without a name, which goes with the program at the
-/// latest.
+/// It is kept in memory up to a limit, and beyond that in a temporary file.
 class FOUNDATION_API Spool final : public Source
 {
 public:
@@ -22,16 +23,15 @@ public:
     std::uint64_t size() const override { return size_; }
     std::size_t readAt(std::uint64_t offset, char* buffer, std::size_t count) const override;
 
-    bool isInMemory() const { return file_ == -1; }
+    bool isInMemory() const { return file_ == nullptr; }
 
 private:
     void append(char const* data, std::size_t count, ArchiveLimits const& limits);
     void moveToFile();
-    void write(char const* data, std::size_t count);
 
     std::vector<char> memory_;
     std::uint64_t size_ = 0;
-    int file_ = -1;
+    std::unique_ptr<TemporaryFile> file_;
 };
 
 } // namespace foundation::storage::archive::detail

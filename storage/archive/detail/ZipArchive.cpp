@@ -17,19 +17,6 @@ using Reason = ArchiveException::Reason;
 
 namespace {
 
-/// The locator of an entry: its number in the directory, and whether it is stored as it is.
-constexpr std::uint64_t storedBit = 1;
-
-std::uint64_t numberOf(Node const& node)
-{
-    return node.locator >> 1;
-}
-
-bool isStored(Node const& node)
-{
-    return (node.locator & storedBit) != 0;
-}
-
 constexpr std::uint64_t longestTarget = 4096;
 
 constexpr std::size_t mostHandlesOfAll = 8;
@@ -92,7 +79,7 @@ void addEntry(IndexBuilder& builder, ZipHandle& handle, std::uint64_t number)
                  .kind = kind,
                  .size = entry.size,
                  .modified = entry.modified,
-                 .locator = number << 1 | (entry.isStored ? storedBit : 0),
+                 .locator = ZipArchive::locatorOf(number, entry.isStored),
                  .target = target});
 }
 

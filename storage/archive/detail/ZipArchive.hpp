@@ -24,6 +24,23 @@ public:
 
     std::unique_ptr<Content> open(Index::Id file) const override;
     bool isRandomAccess(Index::Id file) const override;
+    bool isWritable() const override { return true; }
+
+    std::shared_ptr<Source const> const& source() const { return source_; }
+
+    /// How many entries the directory has.
+    std::uint64_t size() const { return size_; }
+
+    static std::uint64_t locatorOf(std::uint64_t number, bool isStored)
+    {
+        return number << 1 | (isStored ? storedBit : 0);
+    }
+
+    /// Which of them a node stands for, unless it has no locator.
+    static std::uint64_t numberOf(Node const& node) { return node.locator >> 1; }
+
+    /// Whether its content stands there as it is.
+    static bool isStored(Node const& node) { return (node.locator & storedBit) != 0; }
 
     /// A handle, shared with others only where as many are in use as may be.
     class Lease
@@ -43,6 +60,8 @@ public:
     };
 
 private:
+    static constexpr std::uint64_t storedBit = 1;
+
     struct Slot
     {
         std::unique_ptr<ZipHandle> handle; ///< nothing until the first user has made it

@@ -2,6 +2,7 @@
 
 #include <storage/archive/detail/time.hpp>
 #include <storage/archive/detail/zipText.hpp>
+#include <storage/archive/detail/zipTimes.hpp>
 
 #include <ctime>
 #include <new>
@@ -20,12 +21,11 @@ constexpr zip_uint32_t folderOfDos = 0x10;
 constexpr zip_int64_t supported =
     ZIP_SOURCE_SUPPORTS_SEEKABLE | ZIP_SOURCE_MAKE_COMMAND_BITMASK(ZIP_SOURCE_ACCEPT_EMPTY);
 
-/// The extra field of times in UTC: a byte that says which are there, then seconds, of the modification first.
-constexpr zip_uint16_t timesField = 0x5455;
+} // namespace
 
-Reason reasonOf(int error)
+Reason reasonOf(::zip_error const& error)
 {
-    switch (error) {
+    switch (error.zip_err) {
     case ZIP_ER_NOPASSWD:
     case ZIP_ER_WRONGPASSWD:
         return Reason::Encrypted;
@@ -41,21 +41,11 @@ Reason reasonOf(int error)
     }
 }
 
-/// Seconds since 1970, where the entry has them apart from the time of day of the place where it was made.
-std::optional<std::int64_t> utcTime(::zip* archive, std::uint64_t number)
+std::u16string nameOfEntry(::zip* archive, std::uint64_t number)
 {
-    zip_uint16_t length = 0;
-    zip_uint8_t const* const field =
-        zip_file_extra_field_get_by_id(archive, number, timesField, 0, &length, ZIP_FL_CENTRAL);
-    if (field == nullptr || length < 5 || (field[0] & 1) == 0)
-        return std::nullopt;
-    std::uint32_t seconds = 0;
-    for (unsigned i = 0; i != 4; ++i)
-        seconds |= std::uint32_t{field[1 + i]} << (8 * i);
-    return static_cast<std::int32_t>(seconds);
+    char const* const bytes = zip_get_name(archive, number, ZIP_FL_ENC_RAW);
+    return bytes == nullptr ? std::u16string() : fromZipText(bytes);
 }
-
-} // namespace
 
 ZipHandle::ZipHandle(std::shared_ptr<Source const> source)
     : reader_(std::move(source)), error_(std::make_unique<::zip_error>())
@@ -93,10 +83,10 @@ ZipEntry ZipHandle::entry(std::uint64_t number)
     if (zip_stat_index(zip_, number, ZIP_FL_ENC_RAW, &stat) != 0)
         throwFault(*zip_get_error(zip_));
     ZipEntry entry;
-    entry.name = fromZipText(stat.name);
+    entry.name = nameOfEntry(zip_, number);
     entry.size = stat.size;
     entry.sizeInArchive = stat.comp_size;
-    entry.modified = toMicroseconds(utcTime(zip_, number).value_or(stat.mtime), 0);
+    entry.modified = utcTimeOfEntry(zip_, number).value_or(toMicroseconds(stat.mtime, 0));
     entry.isStored = stat.comp_method == ZIP_CM_STORE;
     entry.isEncrypted = stat.encryption_method != ZIP_EM_NONE;
     zip_uint8_t system = 0;
@@ -149,7 +139,7 @@ void ZipHandle::throwFault(::zip_error const& error)
         throw Fault(*lastFailure_);
     if (error.zip_err == ZIP_ER_MEMORY)
         throw std::bad_alloc();
-    throw Fault(reasonOf(error.zip_err));
+    throw Fault(reasonOf(error));
 }
 
 /// No exception may pass through libzip.

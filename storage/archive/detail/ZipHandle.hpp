@@ -30,6 +30,12 @@ struct ZipEntry
     bool isFolder = false; ///< as the attributes have it, whatever the name
 };
 
+/// The name of an entry; empty where it has none.
+std::u16string nameOfEntry(::zip* archive, std::uint64_t number);
+
+/// What an error of libzip means.
+ArchiveException::Reason reasonOf(::zip_error const& error);
+
 /// An archive opened by libzip. One thread at a time may use it, and holds its lock meanwhile.
 ///
 /// Errors: `Fault`.

@@ -54,6 +54,7 @@ TEST(ArchiveException, EveryReasonHasACodeAndAName)
                            {Reason::EntryTooLarge, ErrorCode::FileTooLarge, "Reason::EntryTooLarge"},
                            {Reason::RatioTooHigh, ErrorCode::FileTooLarge, "Reason::RatioTooHigh"},
                            {Reason::SpoolTooLarge, ErrorCode::FileTooLarge, "Reason::SpoolTooLarge"},
+                           {Reason::NotWritten, ErrorCode::IOError, "Reason::NotWritten"},
                            {Reason::StoreFailed, ErrorCode::IOError, "Reason::StoreFailed"},
                            {static_cast<Reason>(99), ErrorCode::Unknown, "Unhandled Reason"}})
     {

@@ -2,6 +2,13 @@
 
 #include <tests/support/Process.hpp>
 
+#include <chrono>
+#include <csignal>
+#include <cstdlib>
+#include <filesystem>
+#include <thread>
+#include <unistd.h>
+
 #include <sys/stat.h>
 
 namespace {
@@ -26,10 +33,26 @@ protected:
         EXPECT_EQ(runProgram(command, {.workingFolder = folder / from}).status, 0);
     }
 
-    std::string inside(std::string const& path) const
+    std::string zip(std::string const& name, std::string const& path) const
     {
-        return "zip:file://" + (folder / "a.zip").string() + "!" + path;
+        return "zip:file://" + (folder / name).string() + "!" + path;
     }
+
+    bool hasTemporaryFile(Process const& process) const
+    {
+        namespace fs = std::filesystem;
+        std::string const inside = (fs::canonical(folder.path()) / "temporary").native() + '/';
+        std::error_code gone;
+        fs::directory_iterator file("/proc/" + std::to_string(process.id()) + "/fd", gone);
+        for (; !gone && file != fs::directory_iterator(); file.increment(gone)) {
+            std::error_code closed;
+            if (fs::read_symlink(file->path(), closed).native().starts_with(inside))
+                return true;
+        }
+        return false;
+    }
+
+    std::string inside(std::string const& path) const { return zip("a.zip", path); }
 };
 
 TEST_F(Archive, IsListedAsFolders)
@@ -71,10 +94,83 @@ TEST_F(Archive, IsSearchedCountedAndDescribed)
     EXPECT_NE(runWell({"tree", inside("/")}).find("a b.txt"), std::string::npos);
 }
 
-TEST_F(Archive, IsNotWrittenTo)
+TEST_F(Archive, IsMadeByCopyingIntoIt)
 {
-    runFailing({"put", inside("/new")}, "storage: put: " + inside("/new") + ": the store is read-only\n");
-    runFailing({"rm", inside("/big")}, "storage: rm: " + inside("/big") + ": the store is read-only\n");
+    runWell({"cp", "-r", "tree", zip("new.zip", "/")});
+    runWell({"cp", "-r", zip("new.zip", "/tree"), "out"});
+    EXPECT_TRUE(areEqual("tree", "out"));
+    EXPECT_EQ(runProgram({"/usr/bin/env", "unzip", "-tq", "new.zip"}, inFolder()).status, 0);
+}
+
+TEST_F(Archive, TakesFilesAndFoldersAndGivesThemUp)
+{
+    folder.write("file", "content");
+    runWell({"cp", "file", inside("/docs/copied")});
+    runWell({"mkdir", inside("/made")});
+    runWell({"mv", inside("/docs/empty"), inside("/made")});
+    runWell({"rm", "-r", inside("/docs/a%20b.txt"), inside("/big")});
+    EXPECT_EQ(runWell({"find", inside("/")}), inside("/") + "\n" + inside("/docs") + "\n" + inside("/docs/copied") +
+                                                  "\n" + inside("/made") + "\n" + inside("/made/empty") + "\n");
+    EXPECT_EQ(runWell({"cat", inside("/docs/copied")}), "content");
+}
+
+TEST_F(Archive, TakesStandardInput)
+{
+    folder.write("input", "put in");
+    ProcessOptions options = inFolder();
+    options.input = folder / "input";
+    EXPECT_EQ(runProgram(command({"put", inside("/put")}), options).status, 0);
+    EXPECT_EQ(runWell({"cat", inside("/put")}), "put in");
+}
+
+TEST_F(Archive, IsWrittenInAnotherOne)
+{
+    std::string const deep = "zip:" + zip("outer.zip", "/inner.zip") + "!/x";
+    folder.write("file", "content");
+    runWell({"cp", "file", deep});
+    EXPECT_EQ(runWell({"cat", deep}), "content");
+    EXPECT_EQ(runProgram({"/usr/bin/env", "unzip", "-tq", "outer.zip"}, inFolder()).status, 0);
+}
+
+TEST_F(Archive, ReceivesWhatIsMoved)
+{
+    runWell({"mv", "tree", zip("new.zip", "/")});
+    EXPECT_FALSE(exists("tree"));
+    EXPECT_EQ(runWell({"cat", zip("new.zip", "/tree/docs/a%20b.txt")}), "text of a");
+}
+
+TEST_F(Archive, ThatCannotBeWrittenLeavesWhatWasToBeMoved)
+{
+    folder.write("file", "content");
+    runFailing({"mv", "file", "zip:file://" + (folder / "missing/new.zip").string() + "!/"},
+               "storage: mv: zip:file://" + (folder / "missing/new.zip").string() +
+                   "!/file: the archive cannot be written, and stays as it was: there is no folder to hold it\n");
+    EXPECT_TRUE(isFile("file"));
+}
+
+/// The first file is copied by the time that the second, which has no end, takes a temporary file.
+TEST_F(Archive, IsNotWrittenAfterAnInterrupt)
+{
+    folder.write("file", "content");
+    makeFolder("temporary");
+    std::filesystem::create_symlink("/proc/" + std::to_string(::getpid()) + "/pagemap", folder / "endless");
+    ::setenv("TMPDIR", (folder / "temporary").c_str(), 1);
+    Process process(command({"cp", "-j", "1", "file", "endless", inside("/")}), inFolder());
+    auto const deadline = std::chrono::steady_clock::now() + std::chrono::seconds(60);
+    while (!hasTemporaryFile(process) && process.isRunning() && std::chrono::steady_clock::now() < deadline)
+        std::this_thread::yield();
+    EXPECT_TRUE(hasTemporaryFile(process));
+    process.send(SIGINT);
+    EXPECT_EQ(process.finish().status, 130);
+    EXPECT_EQ(runWell({"ls", inside("/")}), "big\ndocs\n");
+}
+
+TEST_F(Archive, LeavesNothingBesideItself)
+{
+    folder.write("file", "content");
+    std::size_t const before = countEntries();
+    runWell({"cp", "file", inside("/")});
+    EXPECT_EQ(countEntries(), before);
 }
 
 TEST_F(Archive, ThatIsNoneIsToldFromAMissingOne)
