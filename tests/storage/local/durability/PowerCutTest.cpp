@@ -42,7 +42,8 @@ struct Written
 {
     std::array<std::atomic<std::uint64_t>, fileCount> numbers{};
     std::atomic<std::uint64_t> count{0};
-    std::atomic<bool> isPowerOff{false}; ///< whoever is told of something after that is not there any more
+    std::atomic<std::uint64_t> folders{0}; ///< the number of the last folder that was made and written into
+    std::atomic<bool> isPowerOff{false};   ///< whoever is told of something after that is not there any more
 };
 
 StorageIRI iriOf(fs::path const& path)
@@ -59,17 +60,48 @@ void write(LocalProvider const& provider, StorageIRI const& file, std::string co
     stream->close(StreamClosePolicy::Commit);
 }
 
-/// Writes to one file after the other until the power goes.
+/// Has the content copied from another file.
+void copy(LocalProvider const& provider, fs::path const& folder, StorageIRI const& file, std::string const& content)
+{
+    fs::path const source = folder / "source";
+    std::ofstream(source, std::ios::binary | std::ios::trunc) << content;
+    provider.copyFileAtomic(iriOf(source), file, ReplacementPolicy::Overwrite, {});
+}
+
+fs::path pathOfFolder(fs::path const& folder, std::uint64_t number)
+{
+    return folder / ("folder " + std::to_string(number));
+}
+
+void makeFolder(LocalProvider const& provider, fs::path const& folder, std::uint64_t number)
+{
+    fs::path const path = pathOfFolder(folder, number);
+    provider.createFolder(iriOf(path));
+    write(provider, iriOf(path / "file"), madeContent(number));
+}
+
+/// Writes to one file after the other until the power goes, copies to the last of them, and makes a folder with a file
+/// each tenth time.
 [[noreturn]] void writeUntilTheEnd(LocalProvider const& provider, fs::path const& folder, Written& written)
 {
     try {
         for (std::uint64_t turn = 0;; ++turn) {
             std::size_t const i = turn % fileCount;
             std::uint64_t const number = written.numbers[i] + 1;
-            write(provider, iriOf(folder / std::to_string(i)), madeContent(number));
+            StorageIRI const file = iriOf(folder / std::to_string(i));
+            bool const makes = turn % 10 == 9;
+            if (i + 1 == fileCount)
+                copy(provider, folder, file, madeContent(number));
+            else
+                write(provider, file, madeContent(number));
             if (written.isPowerOff)
                 ::_exit(EXIT_SUCCESS);
             written.numbers[i] = number;
+            if (makes)
+                makeFolder(provider, folder, written.folders + 1);
+            if (written.isPowerOff)
+                ::_exit(EXIT_SUCCESS);
+            written.folders += makes ? 1 : 0;
             ++written.count;
         }
     } catch (std::exception const&) {
@@ -100,6 +132,8 @@ struct Losses
     int kept = 0;
     int lost = 0; ///< an older content than was acknowledged
     int torn = 0;
+    int foldersKept = 0; ///< with the file in them
+    int foldersLost = 0;
 };
 
 class PowerCuts
@@ -120,7 +154,7 @@ public:
         pid_t const writer = ::fork();
         if (writer == 0)
             writeUntilTheEnd(provider_, disk_.path(), *written_);
-        while (written_->count < before + fileCount)
+        while (written_->count < before + 2 * fileCount)
             if (int status = 0; ::waitpid(writer, &status, WNOHANG) != 0)
                 throw std::runtime_error("the writer does not write");
         timespec const moment{.tv_sec = 0, .tv_nsec = static_cast<long>(random_() % 10'000'000)};
@@ -134,6 +168,7 @@ public:
         written_->isPowerOff = false;
         for (std::size_t i = 0; i < fileCount; ++i)
             judge(i);
+        judgeFolders();
     }
 
     Losses const& losses() const { return losses_; }
@@ -141,17 +176,32 @@ public:
 private:
     void judge(std::size_t i)
     {
-        std::ostringstream content;
-        content << std::ifstream(disk_.path() / std::to_string(i), std::ios::binary).rdbuf();
         std::uint64_t const acknowledged = written_->numbers[i];
         try {
-            std::uint64_t const found = numberOfContent(content.str());
+            std::uint64_t const found = numberOfContent(contentOf(disk_.path() / std::to_string(i)));
             bool const isKept = found == acknowledged || found == acknowledged + 1;
             ++(isKept ? losses_.kept : losses_.lost);
             written_->numbers[i] = found;
         } catch (std::runtime_error const&) {
             ++losses_.torn;
         }
+    }
+
+    static std::string contentOf(fs::path const& file)
+    {
+        std::ostringstream content;
+        content << std::ifstream(file, std::ios::binary).rdbuf();
+        return content.str();
+    }
+
+    /// All that were ever made; the next one may have been, too, and is made anew.
+    void judgeFolders()
+    {
+        for (std::uint64_t number = 1; number <= written_->folders; ++number) {
+            bool const isThere = contentOf(pathOfFolder(disk_.path(), number) / "file") == madeContent(number);
+            ++(isThere ? losses_.foldersKept : losses_.foldersLost);
+        }
+        fs::remove_all(pathOfFolder(disk_.path(), written_->folders + 1));
     }
 
     MountedFileSystem disk_;
@@ -169,6 +219,8 @@ TEST_P(PowerCut, LosesNothingThatAFullCommitAcknowledged)
         cuts.cutOnce();
     EXPECT_EQ(cuts.losses().lost, 0);
     EXPECT_EQ(cuts.losses().torn, 0);
+    EXPECT_EQ(cuts.losses().foldersLost, 0);
+    EXPECT_GE(cuts.losses().foldersKept, powerCuts);
     EXPECT_EQ(cuts.losses().kept, powerCuts * static_cast<int>(fileCount));
 }
 
