@@ -182,6 +182,29 @@ TEST_F(LocalProviderRecursiveListing, EndsWhereTheTreeIsRemovedAroundIt)
     }
 }
 
+TEST_F(LocalProviderRecursiveListing, GoesAsDeepWithAttributesAndConfined)
+{
+    makeDeepFolders(folder.path(), 5000);
+    LocalProvider confined;
+    boost::property_tree::ptree settings;
+    settings.put("root", folder.path().native());
+    confined.configure(settings);
+    for (LocalProvider const* const each : {&provider, &confined}) {
+        std::size_t count = 0;
+        std::size_t longest = 0;
+        auto const listing = each->listAllRecursive(folder.iri());
+        for (FolderEntry const& entry : entries(*listing)) {
+            ++count;
+            longest = std::max(longest, entry.getName().size());
+            EXPECT_EQ(entry.isFile(), entry.getFileAttributes().has_value());
+        }
+        EXPECT_EQ(count, 5000U + 1 + content.size());
+        EXPECT_EQ(longest, 5000U * 2 + 4);
+    }
+    confined.removeFolderRecursively(folder.iri(u"d"));
+    EXPECT_EQ(allNamesOnly(), content);
+}
+
 TEST_F(LocalProviderRecursiveListing, PassesOverWhatIsMovedAwayMeanwhile)
 {
     constexpr std::size_t depth = 100;
