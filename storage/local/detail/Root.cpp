@@ -49,7 +49,7 @@ int openMounted(int folder, std::string& path, FileDescriptor& mounted)
         path.erase(0, path.find_first_not_of('/', way.size()));
         return error;
     }
-    return error == 0 || error == ELOOP ? EACCES : error;
+    return error == 0 ? EACCES : error;
 }
 
 /// Follows links, none of which leads from one file system to another.
@@ -60,7 +60,7 @@ int openWithinMounts(int folder, std::string path, open_how how, FileDescriptor&
     for (FileDescriptor mounted; error == EXDEV;) {
         FileDescriptor next;
         if (int const failure = openMounted(mounted.isOpen() ? mounted.get() : folder, path, next))
-            return failure == EXDEV ? EACCES : failure;
+            return failure == EXDEV || failure == ELOOP ? EACCES : failure;
         mounted = std::move(next);
         error = openBeneath(mounted.get(), path.empty() ? "." : path.c_str(), how, file);
     }
