@@ -28,7 +28,7 @@ public:
     /// The content of a file, from its beginning. Throws `Fault`; of limits, those on the content.
     virtual std::unique_ptr<Content> open(Index::Id file) const = 0;
 
-    /// Whether content can be read at any place at once.
+    /// Whether content can be read at any place at once. Throws `Fault`.
     virtual bool isRandomAccess(Index::Id file) const = 0;
 
     /// Whether archives of this format can be changed.

@@ -17,6 +17,8 @@ using Reason = ArchiveException::Reason;
 
 namespace {
 
+constexpr std::uint64_t largestPieceOfAnImage = 0xF000'0000;
+
 void enable(::archive* reader, ArchiveFormat format)
 {
     switch (format) {
@@ -91,6 +93,7 @@ bool Cursor::next()
     // A name that does not fit into the locale is a warning, and comes as it is.
     if (result != ARCHIVE_OK && result != ARCHIVE_WARN)
         throwFault();
+    isDoubtful_ = result == ARCHIVE_WARN;
     ++count_;
     contentRead_ = 0;
     return true;
@@ -126,15 +129,16 @@ bool Cursor::isEncrypted() const
     return archive_entry_is_data_encrypted(entry_) != 0;
 }
 
-/// libarchive has then read as far as the content, of which a tar leaves out gaps.
+/// libarchive has then read as far as the content, of which a tar leaves out gaps. In an image, larger files come in
+/// several pieces, and a warning may be that the content lies elsewhere.
 std::optional<std::uint64_t> Cursor::offsetOfPlainContent() const
 {
-    bool const isInOnePiece = format_ == ArchiveFormat::Tar || format_ == ArchiveFormat::Cpio;
-    la_int64_t const offset = archive_filter_bytes(archive_.get(), 0);
-    if (!isInOnePiece || offset < 0 || archive_entry_filetype(entry_) != AE_IFREG ||
-        archive_entry_sparse_count(entry_) > 0)
+    if (format_ == ArchiveFormat::SevenZip || archive_entry_filetype(entry_) != AE_IFREG)
         return std::nullopt;
-    return static_cast<std::uint64_t>(offset);
+    bool const isInOnePiece = format_ == ArchiveFormat::Iso ? size() < largestPieceOfAnImage && !isDoubtful_
+                                                            : archive_entry_sparse_count(entry_) == 0;
+    la_int64_t const offset = archive_filter_bytes(archive_.get(), 0);
+    return isInOnePiece && offset >= 0 ? std::optional(static_cast<std::uint64_t>(offset)) : std::nullopt;
 }
 
 /// A warning about content is a checksum that does not match.

@@ -64,6 +64,7 @@ private:
     std::optional<Fault> failure_; ///< of the feed, which libarchive knows as an error of reading alone
     LibArchivePtr archive_;
     ::archive_entry* entry_ = nullptr;
+    bool isDoubtful_ = false; ///< libarchive warns of the entry
     std::uint64_t count_ = 0;
     std::uint64_t contentRead_ = 0; ///< of the entry
     std::u16string path_;

@@ -7,7 +7,9 @@
 #include <storage/archive/detail/PlainContent.hpp>
 
 #include <algorithm>
+#include <array>
 #include <optional>
+#include <string_view>
 #include <utility>
 
 namespace foundation::storage::archive::detail {
@@ -34,6 +36,8 @@ std::uint64_t locatorOf(Cursor const& cursor, bool isCompressed)
         return *offset << locatorShift | plainBit;
     return cursor.number() << locatorShift | (cursor.isEncrypted() ? encryptedBit : 0);
 }
+
+constexpr std::string_view beginningInZisofs("\x37\xE4\x53\x96\xC9\xDB\xD6\x07", 8);
 
 bool mayBeCompressed(ArchiveFormat format)
 {
@@ -88,7 +92,28 @@ void CursorArchive::readEntries(IndexBuilder& builder, Cursor& cursor, std::int6
 
 bool CursorArchive::isRandomAccess(Index::Id file) const
 {
-    return (index().at(file).locator & plainBit) != 0;
+    std::uint64_t const locator = index().at(file).locator;
+    return (locator & plainBit) != 0 && !isCompressedInImage(locator >> locatorShift);
+}
+
+/// Nothing but the content tells of a file that was compressed for an image. One that merely looks so loses no more
+/// than being read at any place at once.
+bool CursorArchive::isCompressedInImage(std::uint64_t offset) const
+{
+    std::array<char, beginningInZisofs.size()> beginning;
+    return format_ == ArchiveFormat::Iso &&
+           source_->readAt(offset, beginning.data(), beginning.size()) == beginning.size() &&
+           std::string_view(beginning.data(), beginning.size()) == beginningInZisofs;
+}
+
+std::uint64_t CursorArchive::numberAt(std::uint64_t offset, std::uint64_t size) const
+{
+    auto const cursor = newCursor();
+    while (cursor->next()) {
+        if (cursor->offsetOfPlainContent() == offset && cursor->size() == size)
+            return cursor->number();
+    }
+    throw Fault(Reason::Changed);
 }
 
 /// The size of the archive stands for that of the entry in it, which nothing tells: gaps take no room in a tar, and
@@ -101,8 +126,10 @@ std::unique_ptr<Content> CursorArchive::open(Index::Id file) const
     if (isRandomAccess(file))
         return openPlain(node.locator >> locatorShift, node.size);
     requireWithinLimits(limits_, node.size, source_->size());
+    std::uint64_t const place = node.locator >> locatorShift;
     return std::make_unique<CursorContent>(std::static_pointer_cast<CursorArchive const>(shared_from_this()),
-                                           node.locator >> locatorShift, node.size);
+                                           (node.locator & plainBit) != 0 ? numberAt(place, node.size) : place,
+                                           node.size);
 }
 
 /// Content that breaks off is not begun.

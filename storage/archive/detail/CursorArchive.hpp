@@ -37,6 +37,8 @@ private:
     std::unique_ptr<Cursor> takeOldest() const;
     void readIndex(std::int64_t modified);
     void readEntries(IndexBuilder& builder, Cursor& cursor, std::int64_t modified) const;
+    bool isCompressedInImage(std::uint64_t offset) const;
+    std::uint64_t numberAt(std::uint64_t offset, std::uint64_t size) const;
     std::unique_ptr<Content> openPlain(std::uint64_t offset, std::uint64_t size) const;
 
     ArchiveFormat const format_;

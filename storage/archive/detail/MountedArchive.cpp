@@ -225,7 +225,8 @@ ExtendedAttributes MountedArchive::extendedAttributes(StorageIRI const& iri) con
     Index::Id const id = require({archive, &archive->index()}, iri);
     if (archive->index().at(id).kind != EntryKind::File)
         return {};
-    std::string const access = archive->isRandomAccess(id) ? randomAccess : sequentialAccess;
+    bool const isRandom = at(iri, [&] { return archive->isRandomAccess(id); });
+    std::string const access = isRandom ? randomAccess : sequentialAccess;
     return ExtendedAttributes({{accessAttribute, access}});
 }
 

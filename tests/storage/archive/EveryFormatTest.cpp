@@ -1,16 +1,23 @@
 #include <storage/archive/ArchiveProvider.hpp>
 
+#include <storage/local/LocalProvider.hpp>
 #include <tests/storage/archive/ObservedStore.hpp>
 #include <tests/storage/archive/archives.hpp>
 #include <tests/storage/archive/containers.hpp>
+#include <tests/support/Process.hpp>
+#include <tests/support/TemporaryFolder.hpp>
+
+#include <boost/any.hpp>
 
 #include <gmock/gmock.h>
 
+#include <filesystem>
 #include <memory>
 
 namespace foundation::storage::archive {
 
 using namespace provider;
+using namespace tests::support;
 using Reason = ArchiveException::Reason;
 
 namespace {
@@ -187,6 +194,27 @@ TEST(UncompressedTar, ReadsNothingOfOtherEntriesToOpenOne)
     long const before = observed.store->counts().bytes;
     EXPECT_EQ(read(root, nameOf(count - 1)), contentOf(count - 1));
     EXPECT_EQ(observed.store->counts().bytes - before, static_cast<long>(contentOf(count - 1).size()));
+}
+
+TEST(Image, HoldsCompressedFilesAmongOthers)
+{
+    TemporaryFolder const folder;
+    std::filesystem::create_directory(folder / "tree");
+    folder.write("tree/large", numbers(100'000));
+    folder.write("tree/small", "small");
+    std::vector<std::string> const pack{"/usr/bin/env",  "xorriso",  "-outdev", "image", "-map", "tree", "/",
+                                        "-set_filter_r", "--zisofs", "/",       "--"};
+    ASSERT_EQ(runProgram(pack, {.workingFolder = folder.path()}).status, 0);
+    StorageItem const image(std::make_shared<local::LocalProvider>(), folder.iri(u"image"));
+    StorageItem const root = openRoot(ArchiveFormat::Iso, image);
+    auto const accessOf = [&](std::u16string const& name) {
+        boost::any const access = StorageItem(root, name).getExtendedAttributes().getAttribute("archive.access");
+        return boost::any_cast<std::string>(access);
+    };
+    EXPECT_EQ(accessOf(u"large"), "sequential");
+    EXPECT_EQ(accessOf(u"small"), "random");
+    EXPECT_EQ(read(root, u"large"), numbers(100'000));
+    EXPECT_EQ(read(root, u"small"), "small");
 }
 
 TEST(UncompressedTar, IsIndexedWithoutReadingContent)
