@@ -208,6 +208,17 @@ void ScratchEntry::remove() const
 
 } // namespace
 
+std::u16string makeScratchName()
+{
+    std::string const name = scratchName();
+    return std::u16string(name.begin(), name.end());
+}
+
+bool isScratchName(std::u16string_view name)
+{
+    return detail::isScratchName(name);
+}
+
 ScratchFileState examineScratchFile(StorageIRI const& file, std::chrono::seconds age)
 {
     return ScratchEntry(file).examine(age);

@@ -4,8 +4,17 @@
 #include <storage/provider/StorageIRI.hpp>
 
 #include <chrono>
+#include <string>
+#include <string_view>
 
 namespace foundation::storage::local {
+
+/// A name for a file that is still being written, which nobody else picks and nobody can foretell: a random UUID and
+/// ".tmp.bak".
+FOUNDATION_API std::u16string makeScratchName();
+
+/// Whether a name has the form of those: the UUID of version 4, in lower case.
+FOUNDATION_API bool isScratchName(std::u16string_view name);
 
 /// What can be told of a scratch file that a writer left, or has not finished.
 enum class ScratchFileState

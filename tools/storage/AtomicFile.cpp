@@ -1,7 +1,7 @@
 #include <tools/storage/AtomicFile.hpp>
 
+#include <storage/local/scratchFiles.hpp>
 #include <storage/provider/Exception.hpp>
-#include <tools/storage/scratchName.hpp>
 
 namespace foundation::storage::tool {
 
@@ -22,7 +22,7 @@ AtomicFile::AtomicFile(provider::StorageItem const& target, Replace replace) : T
         transaction_ = target.openTransactionalStream(newFile);
         return;
     }
-    scratch_.emplace(target.getParent(), makeScratchName());
+    scratch_.emplace(target.getParent(), local::makeScratchName());
     scratchStream_ = scratch_->openStream(newFile);
 }
 

@@ -75,7 +75,7 @@ void CopyRun::lookAround()
     checkInterrupt();
     Progress& progress = session_.progress();
     progress.update();
-    if (!announced_.empty() && progress.hasBegun())
+    if (!announced_.empty() && progress.isSoon())
         counter_.emplace(session_.stores(), std::exchange(announced_, {}), progress);
 }
 

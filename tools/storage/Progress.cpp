@@ -116,9 +116,9 @@ void Progress::showLines()
         style_ = ProgressStyle::Lines;
 }
 
-bool Progress::hasBegun() const
+bool Progress::isSoon() const
 {
-    return isShown() && Clock::now() >= begin_;
+    return isShown() && Clock::now() >= start_ + (begin_ - start_) / 2;
 }
 
 void Progress::addBytes(long count)

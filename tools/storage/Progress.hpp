@@ -58,8 +58,8 @@ public:
 
     bool isShown() const { return style_ != ProgressStyle::Hidden; }
 
-    /// Whether the time has come to tell something.
-    bool hasBegun() const;
+    /// Whether the time has come to find out how much there is to do: a moment before the first line.
+    bool isSoon() const;
 
     void addBytes(long count);
     void addFile();

@@ -1,9 +1,9 @@
 #include <tools/storage/TreeCopier.hpp>
 
+#include <storage/local/scratchFiles.hpp>
 #include <tools/storage/FolderEnd.hpp>
 #include <tools/storage/describe.hpp>
 #include <tools/storage/interrupt.hpp>
-#include <tools/storage/scratchName.hpp>
 
 #include <utility>
 
@@ -96,7 +96,7 @@ void TreeCopier::fail(Failure const& failure)
 /// What a listing calls a folder may be a link to one. What somebody is still writing is nobody else's.
 void TreeCopier::copyEntry(ListedName const& entry)
 {
-    if (entry.isFile && isScratchName(entry.name))
+    if (entry.isFile && local::isScratchName(entry.name))
         return;
     Place source = source_->workingPlaceOf(entry);
     Place target = target_->workingPlaceOf(entry);

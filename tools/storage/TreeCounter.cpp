@@ -1,10 +1,10 @@
 #include <tools/storage/TreeCounter.hpp>
 
+#include <storage/local/scratchFiles.hpp>
 #include <tools/storage/Failure.hpp>
 #include <tools/storage/describe.hpp>
 #include <tools/storage/interrupt.hpp>
 #include <tools/storage/kinds.hpp>
-#include <tools/storage/scratchName.hpp>
 
 #include <exception>
 #include <utility>
@@ -60,7 +60,7 @@ bool TreeCounter::countNext(TreeCursor& tree)
         return true;
     if (!entry)
         tree.leave();
-    else if (entry->isFile && isScratchName(entry->name))
+    else if (entry->isFile && local::isScratchName(entry->name))
         return false; // it is not copied either
     else if (entry->isFile)
         add(entry->size.value_or(0));

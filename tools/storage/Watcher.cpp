@@ -1,5 +1,6 @@
 #include <tools/storage/Watcher.hpp>
 
+#include <storage/local/scratchFiles.hpp>
 #include <tools/storage/FolderStack.hpp>
 #include <tools/storage/describe.hpp>
 #include <tools/storage/entries.hpp>
@@ -7,7 +8,6 @@
 #include <tools/storage/format.hpp>
 #include <tools/storage/interrupt.hpp>
 #include <tools/storage/kinds.hpp>
-#include <tools/storage/scratchName.hpp>
 
 #include <algorithm>
 #include <boost/date_time/microsec_time_clock.hpp>
@@ -316,7 +316,7 @@ bool Watcher::isWanted(EventKind kind) const
 
 bool Watcher::isHidden(StorageIRI const& location) const
 {
-    return !options_.isAll && isScratchName(location.getName());
+    return !options_.isAll && local::isScratchName(location.getName());
 }
 
 /// What changes folders is always needed, to follow them and to tell of what was hidden before.

@@ -7,7 +7,6 @@
 #include <tools/storage/describe.hpp>
 #include <tools/storage/entries.hpp>
 #include <tools/storage/physicalPath.hpp>
-#include <tools/storage/scratchName.hpp>
 #include <tools/storage/values.hpp>
 
 #include <chrono>
@@ -55,7 +54,7 @@ public:
     bool visit(TreeCursor& tree, ListedName const& listed) override
     {
         Kind const kind = tree.kindOf(listed);
-        if (!isScratchName(listed.name))
+        if (!local::isScratchName(listed.name))
             return options_.isRecursive && kind == Kind::RegularFolder;
         Place const place = tree.workingPlaceOf(listed);
         at(place, [&] { cleanEntry(place, kind); });

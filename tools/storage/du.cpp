@@ -1,3 +1,4 @@
+#include <storage/local/scratchFiles.hpp>
 #include <tools/storage/Session.hpp>
 #include <tools/storage/TreeWalk.hpp>
 #include <tools/storage/arguments.hpp>
@@ -5,7 +6,6 @@
 #include <tools/storage/entries.hpp>
 #include <tools/storage/format.hpp>
 #include <tools/storage/physicalPath.hpp>
-#include <tools/storage/scratchName.hpp>
 
 #include <algorithm>
 #include <fmt/format.h>
@@ -139,7 +139,7 @@ bool Summation::visit(TreeCursor& tree, ListedName const& listed)
         return false;
     if (kind == Kind::RegularFile)
         add({listed.size ? *listed.size : describeEntry(tree.workingPlaceOf(listed)).size.value_or(0), 1});
-    else if (!options_.isAll && isScratchName(listed.name))
+    else if (!options_.isAll && local::isScratchName(listed.name))
         hiddenDepth_ = std::min(hiddenDepth_, tree.depth() + 1);
     return kind == Kind::RegularFolder;
 }

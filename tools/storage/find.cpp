@@ -1,9 +1,9 @@
+#include <storage/local/scratchFiles.hpp>
 #include <tools/storage/Session.hpp>
 #include <tools/storage/TreeWalk.hpp>
 #include <tools/storage/arguments.hpp>
 #include <tools/storage/commands.hpp>
 #include <tools/storage/entries.hpp>
-#include <tools/storage/scratchName.hpp>
 #include <tools/storage/values.hpp>
 
 #include <algorithm>
@@ -91,7 +91,7 @@ public:
 
     bool visit(TreeCursor& tree, ListedName const& listed) override
     {
-        if (!options_.isAll && isScratchName(listed.name))
+        if (!options_.isAll && local::isScratchName(listed.name))
             return false;
         bool const isCandidate = fitsName(options_, listed.name);
         bool const needsKind = !listed.isFile || (isCandidate && options_.needsKind());

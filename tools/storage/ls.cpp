@@ -1,3 +1,4 @@
+#include <storage/local/scratchFiles.hpp>
 #include <tools/storage/Session.hpp>
 #include <tools/storage/arguments.hpp>
 #include <tools/storage/commands.hpp>
@@ -6,7 +7,6 @@
 #include <tools/storage/format.hpp>
 #include <tools/storage/interrupt.hpp>
 #include <tools/storage/printable.hpp>
-#include <tools/storage/scratchName.hpp>
 
 #include <algorithm>
 #include <fl/filesystem/native_name.hpp>
@@ -101,7 +101,7 @@ void Lister::listFolder(Place const& folder)
 
 void Lister::listEntry(Place const& folder, ListedName const& listed)
 {
-    if (!options_.isAll && isScratchName(listed.name))
+    if (!options_.isAll && local::isScratchName(listed.name))
         return;
     if (!options_.sort.empty())
         sorted_.push_back(entryOf(folder, listed));

@@ -120,6 +120,18 @@ bool isCommand(std::string const& name)
     return std::any_of(list.begin(), list.end(), [&](Command const& command) { return command.name == name; });
 }
 
+/// "-name" would be read as "-n ame". Answers the option that was meant, or nothing.
+std::string optionMeant(CLI::App const& parser, int count, char const* const* arguments)
+{
+    for (int i = 2; i < count && std::string_view(arguments[i]) != "--"; ++i) {
+        std::string const argument = arguments[i];
+        bool const isSuspect = argument.size() > 2 && argument[0] == '-' && argument[1] != '-';
+        if (isSuspect && parser.get_option_no_throw('-' + argument.substr(0, argument.find('='))) != nullptr)
+            return '-' + argument;
+    }
+    return {};
+}
+
 int run(int count, char const* const* arguments)
 {
     CLI::App app("Files and folders, wherever they are: paths, and IRIs such as file:///tmp/a%20b.", "storage");
@@ -138,6 +150,11 @@ int run(int count, char const* const* arguments)
         return misuse("", "a command is missing");
     if (name.empty() && !first.starts_with('-'))
         return misuse("", fmt::format("no command is called '{}'", first));
+    if (!name.empty()) {
+        std::string const meant = optionMeant(*app.get_subcommand(name), count, arguments);
+        if (!meant.empty())
+            return misuse(name, fmt::format("{}: did you mean {}?", meant.substr(1), meant));
+    }
     try {
         app.parse(markedArguments(count, arguments));
     } catch (CLI::RequiredError const& error) {

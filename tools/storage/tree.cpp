@@ -1,3 +1,4 @@
+#include <storage/local/scratchFiles.hpp>
 #include <tools/storage/Session.hpp>
 #include <tools/storage/TreeCursor.hpp>
 #include <tools/storage/TreeWalk.hpp>
@@ -8,7 +9,6 @@
 #include <tools/storage/interrupt.hpp>
 #include <tools/storage/kinds.hpp>
 #include <tools/storage/printable.hpp>
-#include <tools/storage/scratchName.hpp>
 
 #include <fl/filesystem/native_name.hpp>
 #include <fmt/format.h>
@@ -60,7 +60,7 @@ public:
 
     bool visit(TreeCursor& tree, ListedName const& listed) override
     {
-        if (!isAll_ && isScratchName(listed.name))
+        if (!isAll_ && local::isScratchName(listed.name))
             return false;
         Kind const kind = tree.kindOf(listed);
         print(describeEntry(tree.placeOf(listed), kind, listed), tree.depth() + 1);
@@ -149,7 +149,7 @@ void Drawing::lookAhead()
     branches_.back().next.reset();
     do
         branches_.back().next = tree_->next();
-    while (branches_.back().next && !isAll_ && isScratchName(branches_.back().next->name));
+    while (branches_.back().next && !isAll_ && local::isScratchName(branches_.back().next->name));
 }
 
 /// Folders that were moved away meanwhile are left, too.

@@ -13,5 +13,6 @@ FOUNDATION_API std::string scratchName();
 
 /// Whether a name has the form of those: the UUID of version 4, in lower case.
 FOUNDATION_API bool isScratchName(std::string_view name);
+FOUNDATION_API bool isScratchName(std::u16string_view name);
 
 } // namespace foundation::storage::local::detail

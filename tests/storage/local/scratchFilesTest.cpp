@@ -226,5 +226,15 @@ TEST_F(ScratchFilesWithRefusedLeases, CannotBeJudgedWhenOfOthers)
     EXPECT_EQ(folder.read(name), "content");
 }
 
+TEST(ScratchNames, AreKnownByTheirForm)
+{
+    EXPECT_TRUE(isScratchName(makeScratchName()));
+    EXPECT_TRUE(isScratchName(u"7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak"));
+    // The lower byte of U+0137 is that of the digit 7, and of U+0162 that of the letter b.
+    EXPECT_FALSE(isScratchName(u"\u0137e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak"));
+    EXPECT_FALSE(isScratchName(u"7e9f4b5e-0000-4000-\u0162000-0123456789ab.tmp.bak"));
+    EXPECT_FALSE(isScratchName(u"7e9f4b5e-0000-4000-8000-0123456789ab.tmp.bak.bak"));
+}
+
 } // namespace
 } // namespace foundation::storage::local

@@ -54,6 +54,18 @@ TEST_F(CommandLine, MisuseIsStatusTwoWithAHint)
     }
 }
 
+TEST_F(CommandLine, LongOptionsWithOneDashAreNotReadAsShortOnes)
+{
+    folder.write("ame", "");
+    ProgramResult const result = run({"find", "-name", "ame"});
+    EXPECT_EQ(result.status, 2);
+    EXPECT_EQ(result.errors, "storage: find: -name: did you mean --name?\n"
+                             "storage: 'storage find --help' says more\n");
+    EXPECT_TRUE(
+        run({"find", "-max-depth=1"}).errors.starts_with("storage: find: -max-depth=1: did you mean --max-depth=1?\n"));
+    EXPECT_EQ(runWell({"find", "-name*", "."}), "./ame\n");
+}
+
 TEST_F(CommandLine, NamesThatParsersLikeToInterpretAreNames)
 {
     for (std::string const name : {"[a,b]", "{}", "%%", "ls", "a=b", "'x'", "\"", "\1", "\\", "#x", "?", "*"}) {

@@ -102,10 +102,20 @@ TEST(Progress, TellsNothingOfShortWork)
     {
         Progress progress(std::chrono::hours(1));
         progress.showLines();
-        EXPECT_FALSE(progress.hasBegun());
+        EXPECT_FALSE(progress.isSoon());
         progress.addFile();
     }
     EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
+}
+
+TEST(Progress, IsSoonToldHowMuchThereIsToDo)
+{
+    testing::internal::CaptureStderr();
+    Progress progress(std::chrono::milliseconds(0));
+    EXPECT_FALSE(progress.isSoon()) << "nobody would see it";
+    progress.showLines();
+    EXPECT_TRUE(progress.isSoon());
+    testing::internal::GetCapturedStderr();
 }
 
 TEST(ProgressConcurrency, WritesInTheThreadThatMadeItAlone)

@@ -274,6 +274,8 @@ TEST_F(LocalProviderDurability, SaysThatANewFolderOrAMoveIsNotCertain)
     ReplacedSystemCalls replaced;
     replaced->fsync = [](int) { return failWith(EIO); };
     EXPECT_THROW(provider.createFolder(at(u"new")), DurabilityException);
+    EXPECT_THROW(provider.createFolderRecursive(at(u"several/folders/deep")), DurabilityException);
+    EXPECT_TRUE(fs::exists(folder / "several/folders/deep"));
     EXPECT_THROW(provider.moveFile(at(u"file"), at(u"new/file"), ReplacementPolicy::Preserve), DurabilityException);
     EXPECT_EQ(folder.read("new/file"), "old");
 }
