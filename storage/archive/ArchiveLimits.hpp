@@ -16,6 +16,9 @@ struct ArchiveLimits
     /// Memory for the index of one archive, in bytes.
     std::size_t indexBytes = std::size_t{256} << 20;
 
+    /// Folders within each other. What lies deeper is shown in the root, with its path as one name.
+    unsigned depth = 512;
+
     /// Archives within each other, this one included.
     unsigned nesting = 8;
 

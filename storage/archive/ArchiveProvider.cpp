@@ -32,6 +32,11 @@ ArchiveProvider::ArchiveProvider(ArchiveFormat format, StorageItem container, Ar
 
 ArchiveProvider::~ArchiveProvider() = default;
 
+void ArchiveProvider::addContainerLocation(StorageIRI const& container)
+{
+    archive_->addContainerLocation(container);
+}
+
 void ArchiveProvider::flush()
 {
     if (writable_ != nullptr)

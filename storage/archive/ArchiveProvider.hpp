@@ -39,6 +39,9 @@ public:
     ArchiveProvider(ArchiveFormat format, provider::StorageItem container, ArchiveLimits const& limits = {});
     ~ArchiveProvider() override;
 
+    /// Has this provider take locations in the container under another location of that, too.
+    void addContainerLocation(provider::StorageIRI const& container);
+
     /// Writes the archive anew with all changes, through a transactional stream of the store that holds it. Nothing
     /// happens where nothing has changed.
     ///

@@ -18,6 +18,9 @@
 #include <storage/local/detail/nativePath.hpp>
 #include <storage/local/detail/sync.hpp>
 #include <storage/provider/ChangeEventExceptions.hpp>
+#include <storage/provider/Exception.hpp>
+
+#include <fl/filesystem/native_name.hpp>
 
 #include <cerrno>
 #include <deque>
@@ -157,6 +160,21 @@ bool LocalProvider::doFileExists(StorageIRI const& iri) const
 bool LocalProvider::doFolderExists(StorageIRI const& iri) const
 {
     return doExists(iri) == ExistenceType::AsFolder;
+}
+
+/// What is no possible location, or cannot be looked at, has what its text says.
+StorageIRI LocalProvider::doGetCanonicalLocation(StorageIRI const& iri) const
+{
+    auto const root = this->root();
+    std::string path;
+    try {
+        path = root->canonicalPath(root->pathOf(iri));
+    } catch (Exception const&) {
+        return iri.getResolvedIRI();
+    }
+    if (path.empty())
+        return iri.getResolvedIRI();
+    return StorageIRI(StorageIRI(u"file:///"), fl::filesystem::from_native_bytes(path));
 }
 
 ExistenceType LocalProvider::doExists(StorageIRI const& iri) const

@@ -95,6 +95,8 @@ protected:
     Listing doListAllRecursiveNamesOnlyWildcards(provider::StorageIRI const& folder,
                                                  std::u16string pattern) const override;
 
+    provider::StorageIRI doGetCanonicalLocation(provider::StorageIRI const& iri) const override;
+
     bool doHasFeature(provider::ExtendedFeature const& feature) const override;
 
     void doPublishFolderEventsFor(provider::StorageIRI const& folder, provider::ChangeEventCallback const& callback,

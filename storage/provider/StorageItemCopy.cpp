@@ -4,6 +4,9 @@
 
 #include <storage/provider/ByteStreamFailure.hpp>
 #include <storage/provider/Exception.hpp>
+#include <storage/provider/ReasonInfo.hpp>
+
+#include <boost/exception/get_error_info.hpp>
 
 #include <algorithm>
 #include <utility>
@@ -11,6 +14,15 @@
 namespace foundation::storage::provider {
 
 namespace {
+
+/// Passes the words of a failure on that has some.
+[[noreturn]] void throwInstead(ByteStreamFailure const& failure, ErrorCode code, StorageIRI const& location)
+{
+    Exception exception(code, location);
+    if (auto const* const reason = boost::get_error_info<ReasonInfo>(failure))
+        exception << ReasonInfo(*reason);
+    throw exception;
+}
 
 constexpr std::size_t bufferSize = 1048576;
 
@@ -47,8 +59,8 @@ long checked(Step const& step, Accept const& accept, StorageItem const& item)
     long moved = 0;
     try {
         moved = step();
-    } catch (ByteStreamFailure const&) {
-        throw Exception(ErrorCode::IOError, item.getLocation());
+    } catch (ByteStreamFailure const& failure) {
+        throwInstead(failure, ErrorCode::IOError, item.getLocation());
     }
     if (!accept(moved))
         throw Exception(ErrorCode::IOError, item.getLocation());
@@ -82,7 +94,7 @@ TransactionStatus StorageItem::copyFile(StorageItem const& destination, CopyFile
         closeQuietly(source);
         return status;
     } catch (ByteStreamFailure const& failure) {
-        throw Exception(failure.getErrorCode(), location_);
+        throwInstead(failure, failure.getErrorCode(), location_);
     }
 }
 

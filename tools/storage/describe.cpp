@@ -51,7 +51,7 @@ void rethrowAsFailure(Place const& place)
     } catch (provider::Exception const& error) {
         throw Failure{place.text(), explain(error)};
     } catch (provider::ByteStreamFailure const& error) {
-        throw Failure{place.text(), describe(error.getErrorCode())};
+        throw Failure{place.text(), explain(error)};
     } catch (provider::ChangeEventsNotSupportedException const&) {
         throw Failure{place.text(), "the store does not tell of changes"};
     } catch (provider::ChangeEventsSubscriptionException const&) {

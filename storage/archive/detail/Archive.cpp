@@ -10,14 +10,46 @@ namespace foundation::storage::archive::detail {
 
 using Reason = ArchiveException::Reason;
 
+namespace {
+
+bool isLimit(Reason reason)
+{
+    return errorCodeOf(reason) == provider::ErrorCode::FileTooLarge;
+}
+
+/// libzip refuses a zip as a whole for whatever is wrong with one of its entries; libarchive takes entries one by one.
+std::shared_ptr<Archive const> openZip(std::shared_ptr<Source const> const& source, ArchiveLimits const& limits,
+                                       std::int64_t modified)
+{
+    try {
+        return std::make_shared<ZipArchive>(source, limits, modified);
+    } catch (Fault const& refusal) {
+        if (refusal.reason != Reason::Damaged)
+            throw;
+        try {
+            auto archive = std::make_shared<CursorArchive>(ArchiveFormat::Zip, source, limits, modified);
+            if (archive->index().size() > 1)
+                return archive;
+        } catch (Fault const& fault) {
+            if (fault.reason == Reason::StoreFailed || isLimit(fault.reason))
+                throw;
+        }
+        throw Fault(refusal);
+    }
+}
+
+} // namespace
+
 std::shared_ptr<Archive const> openArchive(ArchiveFormat format, provider::StorageItem const& container,
                                            ArchiveLimits const& limits)
 {
     std::int64_t const modified = toMicroseconds(container.getFileAttributes().getLastModified());
-    std::shared_ptr<Source const> const source = openSource(container, limits);
+    bool const hasChecksums = format == ArchiveFormat::Zip || format == ArchiveFormat::SevenZip;
+    std::shared_ptr<Source const> const source =
+        openSource(container, limits, hasChecksums ? Checksums::Inside : Checksums::Outside);
     switch (format) {
     case ArchiveFormat::Zip:
-        return std::make_shared<ZipArchive>(source, limits, modified);
+        return openZip(source, limits, modified);
     case ArchiveFormat::Tar:
     case ArchiveFormat::SevenZip:
     case ArchiveFormat::Iso:

@@ -1,6 +1,7 @@
 #include <storage/archive/detail/Cursor.hpp>
 
 #include <storage/archive/detail/time.hpp>
+#include <storage/archive/detail/zipText.hpp>
 
 #include <fl/filesystem/native_name.hpp>
 
@@ -35,6 +36,7 @@ void enable(::archive* reader, ArchiveFormat format)
         archive_read_support_format_cpio(reader);
         break;
     case ArchiveFormat::Zip:
+        archive_read_support_format_zip_seekable(reader);
         break;
     }
 }
@@ -62,15 +64,17 @@ EntryKind kindOf(archive_entry* entry)
     }
 }
 
-std::u16string toName(char const* bytes)
+std::u16string toName(ArchiveFormat format, char const* bytes)
 {
-    return bytes == nullptr ? std::u16string() : fl::filesystem::from_native_bytes(bytes);
+    if (bytes == nullptr)
+        return {};
+    return format == ArchiveFormat::Zip ? fromZipText(bytes) : fl::filesystem::from_native_bytes(bytes);
 }
 
 } // namespace
 
-Cursor::Cursor(ArchiveFormat format, std::unique_ptr<Feed> feed)
-    : format_(format), feed_(std::move(feed)), archive_(newLibArchive())
+Cursor::Cursor(ArchiveFormat format, std::unique_ptr<Feed> feed, std::uint64_t mostBytesOfDirectory)
+    : format_(format), feed_(std::move(feed)), mostBytesOfDirectory_(mostBytesOfDirectory), archive_(newLibArchive())
 {
     ::archive* const a = archive_.get();
     enable(a, format);
@@ -104,7 +108,7 @@ EntryRecord Cursor::record()
     NameLocale const locale(namesOf(format_));
     EntryRecord record;
     record.kind = kindOf(entry_);
-    path_ = toName(archive_entry_pathname(entry_));
+    path_ = toName(format_, archive_entry_pathname(entry_));
     record.path = path_;
     record.size = size();
     record.modified = archive_entry_mtime_is_set(entry_) != 0
@@ -112,7 +116,7 @@ EntryRecord Cursor::record()
                           : EntryRecord::unknownTime;
     if (record.kind == EntryKind::SymbolicLink || record.kind == EntryKind::HardLink) {
         bool const isHard = record.kind == EntryKind::HardLink;
-        target_ = toName(isHard ? archive_entry_hardlink(entry_) : archive_entry_symlink(entry_));
+        target_ = toName(format_, isHard ? archive_entry_hardlink(entry_) : archive_entry_symlink(entry_));
         record.target = target_;
     }
     return record;
@@ -133,7 +137,8 @@ bool Cursor::isEncrypted() const
 /// several pieces, and a warning may be that the content lies elsewhere.
 std::optional<std::uint64_t> Cursor::offsetOfPlainContent() const
 {
-    if (format_ == ArchiveFormat::SevenZip || archive_entry_filetype(entry_) != AE_IFREG)
+    bool const mayBePacked = format_ == ArchiveFormat::SevenZip || format_ == ArchiveFormat::Zip;
+    if (mayBePacked || archive_entry_filetype(entry_) != AE_IFREG)
         return std::nullopt;
     bool const isInOnePiece = format_ == ArchiveFormat::Iso ? size() < largestPieceOfAnImage && !isDoubtful_
                                                             : archive_entry_sparse_count(entry_) == 0;
@@ -193,9 +198,19 @@ std::ptrdiff_t Cursor::serve(::archive* archive, void* self, void const** data)
     Cursor& cursor = *static_cast<Cursor*>(self);
     return cursor.guarded(archive, [&] {
         auto const bytes = cursor.feed_->next();
+        if (cursor.count_ == 0)
+            cursor.countDirectory(bytes.size());
         *data = bytes.data();
         return static_cast<std::int64_t>(bytes.size());
     });
+}
+
+/// libarchive reads the directories of some formats as a whole, before it answers the first entry.
+void Cursor::countDirectory(std::size_t bytes)
+{
+    bytesOfDirectory_ += bytes;
+    if (bytesOfDirectory_ > mostBytesOfDirectory_)
+        throw Fault(Reason::IndexTooLarge);
 }
 
 std::int64_t Cursor::skip(::archive* archive, void* self, std::int64_t count)

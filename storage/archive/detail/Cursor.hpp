@@ -8,6 +8,7 @@
 #include <storage/archive/detail/LibArchive.hpp>
 
 #include <cstdint>
+#include <limits>
 #include <memory>
 #include <optional>
 #include <string>
@@ -20,7 +21,10 @@ namespace foundation::storage::archive::detail {
 class FOUNDATION_API Cursor
 {
 public:
-    Cursor(ArchiveFormat format, std::unique_ptr<Feed> feed);
+    static constexpr std::uint64_t anyNumber = std::numeric_limits<std::uint64_t>::max();
+
+    /// `mostBytesOfDirectory`: to be read until the first entry is known.
+    Cursor(ArchiveFormat format, std::unique_ptr<Feed> feed, std::uint64_t mostBytesOfDirectory = anyNumber);
     ~Cursor();
     Cursor(Cursor const&) = delete;
     Cursor& operator=(Cursor const&) = delete;
@@ -57,10 +61,13 @@ private:
     template <typename Action>
     std::int64_t guarded(::archive* archive, Action const& action);
 
+    void countDirectory(std::size_t bytes);
     [[noreturn]] void throwFault();
 
     ArchiveFormat const format_;
     std::unique_ptr<Feed> feed_;
+    std::uint64_t const mostBytesOfDirectory_;
+    std::uint64_t bytesOfDirectory_ = 0;
     std::optional<Fault> failure_; ///< of the feed, which libarchive knows as an error of reading alone
     LibArchivePtr archive_;
     ::archive_entry* entry_ = nullptr;

@@ -39,6 +39,14 @@ std::uint64_t locatorOf(Cursor const& cursor, bool isCompressed)
 
 constexpr std::string_view beginningInZisofs("\x37\xE4\x53\x96\xC9\xDB\xD6\x07", 8);
 
+/// Of a zip that is not as it should be: enough for short names, in as many entries as may be.
+std::uint64_t mostBytesOfDirectory(ArchiveLimits const& limits)
+{
+    constexpr std::uint64_t bytesOfARecord = 64;
+    constexpr std::uint64_t bytesBeside = std::uint64_t{1} << 20;
+    return limits.entries * bytesOfARecord + bytesBeside;
+}
+
 bool mayBeCompressed(ArchiveFormat format)
 {
     return format == ArchiveFormat::Tar || format == ArchiveFormat::Cpio;
@@ -59,7 +67,8 @@ CursorArchive::CursorArchive(ArchiveFormat format, std::shared_ptr<Source const>
 std::unique_ptr<Cursor> CursorArchive::newCursor() const
 {
     return std::make_unique<Cursor>(format_,
-                                    isCompressed_ ? openDecompressedFeed(source_, limits_) : openPlainFeed(source_));
+                                    isCompressed_ ? openDecompressedFeed(source_, limits_) : openPlainFeed(source_),
+                                    format_ == ArchiveFormat::Zip ? mostBytesOfDirectory(limits_) : Cursor::anyNumber);
 }
 
 /// Damage to the compression of the whole spoils all; damage to the archive alone only what comes after it.

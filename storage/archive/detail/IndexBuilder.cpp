@@ -41,8 +41,12 @@ IndexBuilder::IndexBuilder(ArchiveLimits const& limits, std::int64_t modified) :
 
 void IndexBuilder::add(EntryRecord const& entry)
 {
+    std::u16string_view path = withoutSeparatorsAtTheEnd(entry.path);
+    std::u16string const flat = isDeeper(path, limits_.depth) ? inOneName(path) : std::u16string();
+    if (!flat.empty())
+        path = flat;
     std::u16string_view name;
-    Id const parent = folderOf(withoutSeparatorsAtTheEnd(entry.path), name);
+    Id const parent = folderOf(path, name);
     bool const isNameless = name.empty() || name == u".";
     if (isNameless && entry.kind == EntryKind::Folder) {
         index_.nodes_[parent].modified = entry.modified;
@@ -208,6 +212,8 @@ void IndexBuilder::resolveHardLink(Id link)
 /// By the names under which entries are shown, since those in a target are escaped alike.
 std::optional<IndexBuilder::Id> IndexBuilder::find(std::u16string_view path) const
 {
+    if (isDeeper(path, limits_.depth))
+        return index_.child(Index::root, safeName(inOneName(path)));
     Id current = Index::root;
     for (std::u16string_view name = takeName(path); !name.empty(); name = takeName(path)) {
         if (name == u".")

@@ -31,7 +31,8 @@ struct EntryRecord
 ///
 /// Whatever the entries are called, each is shown somewhere below the root. Folders that only paths name are there as
 /// well. Of entries with one name the last is shown under it, and those before it with "~1", "~2" … behind their names.
-/// Folders merge. A file that is called like a folder gives way to it.
+/// Folders merge. What lies deeper than allowed is in the root, with its path as its name. A file that is called like a
+/// folder gives way to it.
 ///
 /// Errors: `Fault` for what goes beyond the limits.
 class FOUNDATION_API IndexBuilder

@@ -3,8 +3,9 @@
 #include <storage/archive/detail/EntryStream.hpp>
 #include <storage/archive/detail/Fault.hpp>
 #include <storage/archive/detail/Source.hpp>
-#include <storage/archive/detail/entryName.hpp>
+#include <storage/archive/detail/canonicalPath.hpp>
 #include <storage/provider/Exception.hpp>
+#include <storage/provider/ReasonInfo.hpp>
 
 #include <string>
 #include <utility>
@@ -26,16 +27,11 @@ unsigned depthInside(StorageIRI container)
     return depth;
 }
 
-std::u16string canonicalPath(std::u16string_view path)
+[[noreturn]] void throwLoop(StorageIRI const& iri)
 {
-    std::u16string canonical;
-    for (std::u16string_view name = takeName(path); !name.empty(); name = takeName(path)) {
-        if (name == u"..")
-            canonical.resize(canonical.empty() ? 0 : canonical.rfind(u'/'));
-        else if (name != u".")
-            canonical.append(1, u'/').append(name);
-    }
-    return canonical.empty() ? u"/" : canonical;
+    Exception error(ErrorCode::InvalidLocation, iri);
+    error << ReasonInfo(u"links in the archive lead to each other without end");
+    throw error;
 }
 
 ExistenceTypeExtended typeOfTarget(Index const& index, Index::Id link)
@@ -62,9 +58,28 @@ void MountedArchive::requireInside(StorageIRI const& iri) const
 {
     if (!iri.hasInnerIRI())
         throw Exception(ErrorCode::InvalidLocation, iri);
-    StorageIRI const container = iri.getInnerIRI();
-    if (container != location_ && container.getResolvedIRI() != location_.getResolvedIRI())
+    if (!isContainer(iri.getInnerIRI()))
         throw Exception(ErrorCode::InvalidLocation, iri);
+}
+
+/// What the texts do not tell is asked of the store, which knows its links.
+bool MountedArchive::isContainer(StorageIRI const& location) const
+{
+    if (location == location_)
+        return true;
+    {
+        std::lock_guard const lock(otherLocationsMutex_);
+        if (otherLocations_.contains(location))
+            return true;
+    }
+    StorageItem const item(container_, location.getPath());
+    return item.getLocation() == location && item.getCanonicalLocation() == container_.getCanonicalLocation();
+}
+
+void MountedArchive::addContainerLocation(StorageIRI const& location)
+{
+    std::lock_guard const lock(otherLocationsMutex_);
+    otherLocations_.insert(location);
 }
 
 MountedArchive::Stamp MountedArchive::stampOfContainer() const
@@ -127,9 +142,24 @@ MountedArchive::View MountedArchive::existingView() const
 MountedArchive::ArchivePtr const& MountedArchive::openLocked(Stamp const& stamp) const
 {
     archive_.reset();
-    archive_ = at(location_, [&] { return openArchive(format_, container_, limits_); });
+    if (failure_ && failure_->stamp == stamp)
+        throw ArchiveException(failure_->reason, failure_->code, failure_->location);
+    try {
+        archive_ = at(location_, [&] { return openArchive(format_, container_, limits_); });
+    } catch (ArchiveException const& failure) {
+        rememberFailure(stamp, failure);
+        throw;
+    }
     stamp_ = stamp;
     return archive_;
+}
+
+/// Of failures that will not pass; it may have taken long to come to them.
+void MountedArchive::rememberFailure(Stamp const& stamp, ArchiveException const& failure) const
+{
+    if (failure.getReason() == Reason::StoreFailed || failure.getReason() == Reason::Changed)
+        return;
+    failure_.emplace(Failure{stamp, failure.getReason(), failure.getErrorCode(), failure.getStorageIRI()});
 }
 
 void MountedArchive::release()
@@ -137,13 +167,14 @@ void MountedArchive::release()
     ArchivePtr gone; // goes unlocked
     std::lock_guard const lock(mutex_);
     gone = std::move(archive_);
+    failure_.reset();
 }
 
 Index::Id MountedArchive::require(View const& view, StorageIRI const& iri) const
 {
     Index::Place const place = view.index->find(iri.getPath(), LastLink::Follow);
     if (place.isLoop)
-        throw Exception(ErrorCode::InvalidLocation, iri);
+        throwLoop(iri);
     if (!place.id && view.archive != nullptr && view.archive->isIncomplete())
         throw ArchiveException(Reason::Damaged, location_);
     if (!place.id || view.index->at(*place.id).kind == EntryKind::HardLink)
@@ -253,6 +284,19 @@ StorageIRI MountedArchive::canonicalLocation(StorageIRI const& iri) const
 {
     requireInside(iri);
     return StorageIRI(iri.getScheme(), location_, canonicalPath(iri.getPath()));
+}
+
+/// Where the archive cannot be read, the text has to do.
+std::u16string MountedArchive::canonicalPath(std::u16string const& path) const
+{
+    try {
+        View const view = existingView();
+        if (view.index != nullptr)
+            return detail::canonicalPath(*view.index, path);
+    } catch (Exception const&) {
+        // who opens the location is told
+    }
+    return detail::canonicalPath(path);
 }
 
 } // namespace foundation::storage::archive::detail

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <foundation/export.hpp>
+#include <storage/archive/ArchiveException.hpp>
 #include <storage/archive/ArchiveFormat.hpp>
 #include <storage/archive/ArchiveLimits.hpp>
 #include <storage/archive/detail/Archive.hpp>
@@ -14,6 +15,7 @@
 #include <memory>
 #include <mutex>
 #include <optional>
+#include <set>
 
 namespace foundation::storage::archive::detail {
 
@@ -29,6 +31,9 @@ public:
     MountedArchive(MountedArchive const&) = delete;
     MountedArchive& operator=(MountedArchive const&) = delete;
     virtual ~MountedArchive();
+
+    /// Another location that leads to the container.
+    void addContainerLocation(provider::StorageIRI const& location);
 
     /// Without a container there is nothing.
     provider::ExistenceType exists(provider::StorageIRI const& iri) const;
@@ -90,18 +95,33 @@ protected:
     Index::Id requireFolder(View const& view, provider::StorageIRI const& iri) const;
 
 private:
+    /// Why a container could not be read that has not changed since.
+    struct Failure
+    {
+        Stamp stamp;
+        ArchiveException::Reason reason;
+        provider::ErrorCode code;
+        provider::StorageIRI location;
+    };
+
+    bool isContainer(provider::StorageIRI const& location) const;
+    std::u16string canonicalPath(std::u16string const& path) const;
     Stamp stampOfContainer() const;
     ArchivePtr archive() const;
     ArchivePtr upToDateArchive() const;
+    void rememberFailure(Stamp const& stamp, ArchiveException const& failure) const;
     ArchivePtr const& openLocked(Stamp const& stamp) const;
 
     ArchiveFormat const format_;
     provider::StorageItem const container_;
     provider::StorageIRI const location_; ///< of the container
     ArchiveLimits const limits_;
+    mutable std::mutex otherLocationsMutex_;
+    std::set<provider::StorageIRI> otherLocations_; ///< of the container
     mutable std::mutex mutex_;
     mutable ArchivePtr archive_;
     mutable std::optional<Stamp> stamp_;
+    mutable std::optional<Failure> failure_;
 };
 
 } // namespace foundation::storage::archive::detail

@@ -8,6 +8,7 @@
 #include <optional>
 #include <string>
 #include <utility>
+#include <vector>
 
 namespace foundation::storage::archive::detail {
 
@@ -15,14 +16,29 @@ using namespace provider;
 
 namespace {
 
-bool isSequential(StorageItem const& file)
+/// How a file in another archive can be read; empty for other files.
+std::string accessOf(StorageItem const& file)
 {
     ExtendedAttributes const attributes = file.getExtendedAttributes();
     if (!attributes.hasAttribute(accessAttribute))
-        return false;
+        return {};
     boost::any const value = attributes.getAttribute(accessAttribute);
     auto const* const access = boost::any_cast<std::string>(&value);
-    return access != nullptr && *access == sequentialAccess;
+    return access == nullptr ? std::string() : *access;
+}
+
+/// Has whoever keeps the checksum of a file look at it, at the end.
+void readThrough(ByteStream& stream)
+{
+    std::vector<char> buffer(std::size_t{256} << 10);
+    try {
+        while (stream.read(buffer.data(), static_cast<long>(buffer.size())) > 0) {
+        }
+    } catch (ByteStreamFailure const& failure) {
+        if (failure.getErrorCode() == ErrorCode::IOError)
+            throw Fault(ArchiveException::Reason::Damaged);
+        throw Fault(ArchiveException::Reason::StoreFailed, failure.getErrorCode());
+    }
 }
 
 /// Nothing for a stream that cannot be moved, which then still stands at its beginning.
@@ -38,10 +54,13 @@ std::optional<std::uint64_t> sizeOf(ByteStream& stream)
 
 } // namespace
 
-std::shared_ptr<Source const> openSource(StorageItem const& container, ArchiveLimits const& limits)
+std::shared_ptr<Source const> openSource(StorageItem const& container, ArchiveLimits const& limits, Checksums checksums)
 {
     std::unique_ptr<ByteStream> stream = container.openReadOnlyStream();
-    auto const size = isSequential(container) ? std::nullopt : sizeOf(*stream);
+    std::string const access = accessOf(container);
+    if (access == randomAccess && checksums == Checksums::Outside)
+        readThrough(*stream);
+    auto const size = access == sequentialAccess ? std::nullopt : sizeOf(*stream);
     if (size)
         return std::make_shared<StreamSource>(container, std::move(stream), *size);
     return std::make_shared<Spool>(*stream, limits);

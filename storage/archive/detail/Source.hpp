@@ -33,11 +33,22 @@ inline constexpr char const* accessAttribute = "archive.access";
 inline constexpr char const* randomAccess = "random";
 inline constexpr char const* sequentialAccess = "sequential";
 
+/// Where there are checksums of the content of an archive.
+enum class Checksums
+{
+    Inside,
+    Outside, ///< if anywhere, round the archive as a whole
+};
+
 /// The bytes of a file: through streams of it where they seek well, else through a copy that is made now.
+///
+/// An archive without checksums that is stored in another one is read through first, as that may have one for it, at
+/// which nobody looks who reads here and there.
 ///
 /// Errors: what opening the file throws; `Fault` for what happens to its streams.
 FOUNDATION_API std::shared_ptr<Source const> openSource(provider::StorageItem const& container,
-                                                        ArchiveLimits const& limits);
+                                                        ArchiveLimits const& limits,
+                                                        Checksums checksums = Checksums::Inside);
 
 /// Calls `action`, and makes a `Fault` of a failure in the store below.
 template <typename Action>

@@ -1,5 +1,6 @@
 #include <storage/archive/detail/WritableArchive.hpp>
 
+#include <storage/archive/detail/entryName.hpp>
 #include <storage/archive/detail/time.hpp>
 #include <storage/provider/ByteStreamFailure.hpp>
 #include <storage/provider/Exception.hpp>
@@ -35,8 +36,10 @@ std::size_t bytesOf(std::u16string_view name, StorageIRI const& iri)
     }
 }
 
-void requirePossible(std::u16string_view path, StorageIRI const& iri)
+void requirePossible(std::u16string_view path, ArchiveLimits const& limits, StorageIRI const& iri)
 {
+    if (isDeeper(path, limits.depth)) // which would be a name in the root when it is read
+        throw Exception(ErrorCode::InvalidLocation, iri);
     bool const isText = std::none_of(path.begin(), path.end(), standsForByte);
     if (!isText || path.find(u'\0') != std::u16string_view::npos || bytesOf(path, iri) >= longestPath)
         throw Exception(ErrorCode::InvalidLocation, iri);
@@ -84,6 +87,8 @@ void WritableArchive::beginTree(std::unique_lock<std::mutex>& lock)
     lock.lock();
     if (tree_ != nullptr)
         return;
+    if (version.archive != nullptr && !version.archive->isWritable())
+        throw ArchiveException(ArchiveException::Reason::NotWritten, ErrorCode::UnsupportedOperation, location());
     tree_ = std::make_shared<PendingTree>(version.archive, limits());
     baseStamp_ = version.stamp;
 }
@@ -137,11 +142,11 @@ WritableArchive::Place WritableArchive::requireEntry(PendingTree const& tree, St
 }
 
 /// A place where an entry may come to be.
-WritableArchive::Place WritableArchive::newPlace(PendingTree const& tree, StorageIRI const& iri)
+WritableArchive::Place WritableArchive::newPlace(PendingTree const& tree, StorageIRI const& iri) const
 {
     Place place = WritableArchive::place(tree.index(), iri);
     if (!place.id)
-        requirePossible(tree.path(place.folder) + u'/' + place.name, iri);
+        requirePossible(tree.path(place.folder) + u'/' + place.name, limits(), iri);
     return place;
 }
 

@@ -114,7 +114,7 @@ private:
     static View viewOf(PendingTree const& tree);
     static Place place(Index const& index, provider::StorageIRI const& iri);
     static Place requireEntry(PendingTree const& tree, provider::StorageIRI const& iri);
-    static Place newPlace(PendingTree const& tree, provider::StorageIRI const& iri);
+    Place newPlace(PendingTree const& tree, provider::StorageIRI const& iri) const;
     Index::Id addFile(PendingTree& tree, Place const& place, provider::StorageIRI const& iri);
     void removeEntry(PendingTree& tree, Index::Id id);
 

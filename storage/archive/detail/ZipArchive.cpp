@@ -99,7 +99,7 @@ Index readIndex(ZipHandle& handle, ArchiveLimits const& limits, std::int64_t mod
 ZipArchive::ZipArchive(std::shared_ptr<Source const> source, ArchiveLimits const& limits, std::int64_t modified)
     : source_(std::move(source)), limits_(limits)
 {
-    auto handle = std::make_unique<ZipHandle>(source_);
+    auto handle = std::make_unique<ZipHandle>(source_, limits_);
     index_ = readIndex(*handle, limits_, modified);
     size_ = handle->size();
     slots_.push_back({std::move(handle), 0});
@@ -162,7 +162,7 @@ ZipHandle* ZipArchive::handleOf(std::size_t slot) const
         if (slots_[slot].handle != nullptr)
             return slots_[slot].handle.get();
     }
-    auto handle = std::make_unique<ZipHandle>(source_);
+    auto handle = std::make_unique<ZipHandle>(source_, limits_);
     if (handle->size() != size_)
         throw Fault(Reason::Changed);
     std::lock_guard const lock(mutex_);

@@ -18,6 +18,10 @@ namespace {
 
 constexpr zip_uint32_t folderOfDos = 0x10;
 
+/// In a directory, without its name.
+constexpr std::uint64_t sizeOfRecord = 46;
+constexpr std::uint64_t bytesBesideTheDirectory = std::uint64_t{1} << 20;
+
 constexpr zip_int64_t supported =
     ZIP_SOURCE_SUPPORTS_SEEKABLE | ZIP_SOURCE_MAKE_COMMAND_BITMASK(ZIP_SOURCE_ACCEPT_EMPTY);
 
@@ -47,8 +51,8 @@ std::u16string nameOfEntry(::zip* archive, std::uint64_t number)
     return bytes == nullptr ? std::u16string() : fromZipText(bytes);
 }
 
-ZipHandle::ZipHandle(std::shared_ptr<Source const> source)
-    : reader_(std::move(source)), error_(std::make_unique<::zip_error>())
+ZipHandle::ZipHandle(std::shared_ptr<Source const> source, ArchiveLimits const& limits)
+    : reader_(std::move(source)), limits_(limits), error_(std::make_unique<::zip_error>())
 {
     zip_error_init(error_.get());
     auto const callback = [](void* self, void* data, zip_uint64_t length, zip_source_cmd_t command) {
@@ -64,6 +68,7 @@ ZipHandle::ZipHandle(std::shared_ptr<Source const> source)
         zip_source_free(stream);
         throwFault(error);
     }
+    isOpening_ = false;
 }
 
 ZipHandle::~ZipHandle()
@@ -157,6 +162,18 @@ std::int64_t ZipHandle::serve(void* self, void* data, std::uint64_t length, int 
     return -1;
 }
 
+/// libzip does not ask how much it may read. It reads the head of each record of a directory by itself, unless the
+/// whole is small; were it to do otherwise, the number of bytes is a bound that comes later.
+void ZipHandle::requireWithinLimits(std::uint64_t length)
+{
+    if (length == sizeOfRecord && ++recordsOfDirectory_ > limits_.entries)
+        throw Fault(Reason::TooManyEntries);
+    bytesOfDirectory_ += length;
+    std::uint64_t const heads = sizeOfRecord * limits_.entries + bytesBesideTheDirectory;
+    if (bytesOfDirectory_ > heads && bytesOfDirectory_ - heads > limits_.indexBytes)
+        throw Fault(Reason::IndexTooLarge);
+}
+
 std::int64_t ZipHandle::answer(void* data, std::uint64_t length, int command)
 {
     switch (command) {
@@ -164,6 +181,8 @@ std::int64_t ZipHandle::answer(void* data, std::uint64_t length, int command)
         reader_.seek(0);
         return 0;
     case ZIP_SOURCE_READ:
+        if (isOpening_)
+            requireWithinLimits(length);
         return static_cast<std::int64_t>(reader_.read(static_cast<char*>(data), length));
     case ZIP_SOURCE_STAT: {
         zip_stat_t& stat = *static_cast<zip_stat_t*>(data);

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <foundation/export.hpp>
+#include <storage/archive/ArchiveLimits.hpp>
 #include <storage/archive/detail/BufferedReader.hpp>
 #include <storage/archive/detail/Fault.hpp>
 #include <storage/archive/detail/Source.hpp>
@@ -42,7 +43,9 @@ ArchiveException::Reason reasonOf(::zip_error const& error);
 class FOUNDATION_API ZipHandle
 {
 public:
-    explicit ZipHandle(std::shared_ptr<Source const> source);
+    /// Reads the directory; gives up, and does not keep it in memory, where that has more entries than the limits
+    /// allow.
+    ZipHandle(std::shared_ptr<Source const> source, ArchiveLimits const& limits);
     ~ZipHandle();
     ZipHandle(ZipHandle const&) = delete;
     ZipHandle& operator=(ZipHandle const&) = delete;
@@ -67,11 +70,16 @@ public:
 private:
     static std::int64_t serve(void* self, void* data, std::uint64_t length, int command);
 
+    void requireWithinLimits(std::uint64_t length);
     std::int64_t answer(void* data, std::uint64_t length, int command);
     [[noreturn]] void throwFault(::zip_error const& error);
     [[noreturn]] void throwFault(File const& file);
 
     BufferedReader reader_;
+    ArchiveLimits const limits_;
+    bool isOpening_ = true;
+    std::uint64_t bytesOfDirectory_ = 0;
+    std::uint64_t recordsOfDirectory_ = 0;
     std::unique_ptr<::zip_error> error_;
     std::optional<Fault> failure_;     ///< of the source, which libzip knows as an error of reading alone
     std::optional<Fault> lastFailure_; ///< which libzip may come back to

@@ -27,13 +27,19 @@ constexpr std::size_t longestName = 0xFFFF;
 /// The end of a directory, which is all of a zip that holds nothing. libzip makes no such thing.
 constexpr char emptyZip[22] = {'P', 'K', '\x05', '\x06'};
 
+/// A zip with wrong entries is read in another way, in which nothing can be copied as it is packed.
+ZipArchive const* requireZip(Archive const* archive)
+{
+    auto const* const zip = dynamic_cast<ZipArchive const*>(archive);
+    if (archive != nullptr && zip == nullptr)
+        throw Fault(ArchiveException::Reason::Damaged);
+    return zip;
+}
+
 } // namespace
 
 ZipRewrite::ZipRewrite(PendingTree const& tree, RewriteTarget& target)
-    : tree_(tree),
-      target_(target),
-      old_(static_cast<ZipArchive const*>(tree.base().get())),
-      error_(std::make_unique<::zip_error>())
+    : tree_(tree), target_(target), old_(requireZip(tree.base().get())), error_(std::make_unique<::zip_error>())
 {
     zip_error_init(error_.get());
     if (old_ != nullptr)

@@ -15,6 +15,24 @@ std::u16string_view takeName(std::u16string_view& path)
     return name;
 }
 
+bool isDeeper(std::u16string_view path, std::size_t depth)
+{
+    if (path.size() <= depth)
+        return false;
+    std::size_t names = 0;
+    while (names <= depth && !takeName(path).empty())
+        ++names;
+    return names > depth;
+}
+
+std::u16string inOneName(std::u16string_view path)
+{
+    std::u16string one;
+    for (std::u16string_view name = takeName(path); !name.empty(); name = takeName(path))
+        one.append(one.empty() ? std::u16string_view() : escapedSeparator).append(name);
+    return one;
+}
+
 bool isSafe(std::u16string_view name)
 {
     return !name.empty() && name != u"." && name != u".." && name.find(u'\0') == std::u16string_view::npos;

@@ -94,6 +94,20 @@ std::string withoutSuperfluousSlashes(std::string path)
     return path;
 }
 
+/// Where an open file is; empty where the system does not tell, or it is nowhere any more.
+std::string systemPathOf(FileDescriptor const& file)
+{
+    std::string const link = "/proc/self/fd/" + std::to_string(file.get());
+    std::string path(PATH_MAX, '\0');
+    ssize_t const size =
+        retried([&] { return systemCalls().readlinkat(AT_FDCWD, link.c_str(), path.data(), path.size()); });
+    Status status;
+    if (size <= 0 || size == PATH_MAX || path[0] != '/' || getStatus(file, status) != 0 || status.stx_nlink == 0)
+        return {};
+    path.resize(static_cast<std::size_t>(size));
+    return path;
+}
+
 [[noreturn]] void refuseRoot(std::string const& path, std::string const& reason)
 {
     throw std::invalid_argument("\"" + path + "\" cannot be a root: " + reason);
@@ -121,6 +135,38 @@ std::string Root::pathOf(provider::StorageIRI const& iri) const
     if (!isInside)
         throwError(provider::ErrorCode::PermissionDenied, iri);
     return path;
+}
+
+std::string Root::canonicalPath(std::string const& path) const
+{
+    std::string existing = path;
+    FileDescriptor file;
+    while (int const error = open(existing, O_PATH, file)) {
+        if (!meansMissing(error) || isTop(existing))
+            return {};
+        std::size_t const end = existing.find_last_not_of('/', existing.rfind('/'));
+        existing.resize(end == std::string::npos ? 1 : end + 1);
+    }
+    std::string const found = pathOfOpen(file);
+    std::string const missing = path.substr(existing == "/" ? 0 : existing.size());
+    return found.empty() || existing.size() == path.size() ? found : found == "/" ? missing : found + missing;
+}
+
+/// The folder may have been opened through links, which are left out elsewhere.
+std::string Root::pathOfOpen(FileDescriptor const& file) const
+{
+    std::string const path = systemPathOf(file);
+    if (!isConfined())
+        return path;
+    std::string const top = systemPathOf(folder_);
+    std::string const above = top == "/" ? std::string() : top;
+    bool const isBeneath =
+        !top.empty() && path.starts_with(above) && (path.size() == above.size() || path[above.size()] == '/');
+    if (!isBeneath)
+        return {};
+    std::string const shown =
+        (path_ == "/" ? std::string() : path_) + (path == "/" ? std::string() : path.substr(above.size()));
+    return shown.empty() ? "/" : shown;
 }
 
 /// Never empty, and never absolute: the kernel is given names alone.

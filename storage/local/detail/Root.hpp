@@ -55,6 +55,10 @@ public:
     /// `PermissionDenied` for one that does not lie beneath the folder.
     std::string pathOf(provider::StorageIRI const& iri) const;
 
+    /// The one path of what a path leads to: without links, "." and "..", as far as that exists; what is missing stands
+    /// behind it as it is. It lies beneath the folder as the given one does. Empty where the system does not tell.
+    std::string canonicalPath(std::string const& path) const;
+
     /// Whether a path names the folder above which there is none.
     bool isTop(std::string const& path) const { return path == (isConfined() ? path_ : "/"); }
 
@@ -81,6 +85,7 @@ public:
     bool leadsToFolder(std::string const& path) const;
 
 private:
+    std::string pathOfOpen(FileDescriptor const& file) const;
     char const* relative(std::string const& path) const;
     int openStep(int folder, char const* path, int flags, FileDescriptor& file, mode_t mode) const;
     int descend(std::string& path, Located& entry) const;

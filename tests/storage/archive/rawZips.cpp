@@ -75,7 +75,7 @@ std::string endOf(RawZip const& zip, std::uint32_t directory, std::uint32_t dire
 
 } // namespace
 
-std::string makeRawZip(RawZip const& zip)
+std::string bytesOf(RawZip const& zip)
 {
     std::string body = zip.prefix;
     std::string directory;
@@ -90,7 +90,7 @@ std::string makeRawZip(RawZip const& zip)
 
 std::string makeRawZip(std::vector<RawEntry> const& entries)
 {
-    return makeRawZip(RawZip{.entries = entries});
+    return bytesOf(RawZip{.entries = entries});
 }
 
 std::string deflated(std::string const& content)

@@ -43,7 +43,7 @@ inline constexpr std::uint16_t utf8 = 0x800;
 inline constexpr std::uint32_t linkAttributes = 0120777u << 16;
 
 /// The bytes of a zip that is as wrong as it is told to be.
-std::string makeRawZip(RawZip const& zip);
+std::string bytesOf(RawZip const& zip);
 std::string makeRawZip(std::vector<RawEntry> const& entries);
 
 /// Bytes as raw deflate has them.

@@ -10,6 +10,7 @@
 #include <unistd.h>
 
 #include <sys/stat.h>
+#include <unistd.h>
 
 namespace {
 
@@ -171,6 +172,55 @@ TEST_F(Archive, LeavesNothingBesideItself)
     std::size_t const before = countEntries();
     runWell({"cp", "file", inside("/")});
     EXPECT_EQ(countEntries(), before);
+}
+
+TEST_F(Archive, ThatIsDamagedIsToldInPlainWords)
+{
+    pack({"/usr/bin/env", "zip", "-0qr", "../stored.zip", "docs"}, "tree");
+    std::string bytes = folder.read("stored.zip");
+    bytes[bytes.find("text of a")] ^= 1;
+    folder.write("stored.zip", bytes);
+    std::string const file = "zip:file://" + (folder / "stored.zip").string() + "!/docs/a%20b.txt";
+    std::string const words = ": damaged: it breaks off, contradicts itself, or does not match its checksum\n";
+    runFailing({"cat", file}, "storage: cat: " + file + words);
+    runFailing({"cp", file, "out"}, "storage: cp: " + file + words);
+}
+
+TEST_F(Archive, WithLinksThatLoopIsToldInPlainWords)
+{
+    ASSERT_EQ(::symlink("loop", (folder / "tree/loop").c_str()), 0);
+    pack({"/usr/bin/env", "zip", "-qry", "../loop.zip", "loop"}, "tree");
+    std::string const link = "zip:file://" + (folder / "loop.zip").string() + "!/loop";
+    runFailing({"cat", link}, "storage: cat: " + link + ": links in the archive lead to each other without end\n");
+}
+
+TEST_F(Archive, IsTheOneThatTheLocationLeadsToOverLinks)
+{
+    makeFolder("tree/docs/deep");
+    ASSERT_EQ(::symlink("tree/docs/deep", (folder / "link").c_str()), 0);
+    folder.write("tree/docs/a b.txt", "other");
+    pack({"/usr/bin/env", "zip", "-qr", "../tree/docs/a.zip", "docs"}, "tree");
+    std::string const other = "zip:file://" + (folder / "link/../a.zip").string() + "!/docs/a%20b.txt";
+    EXPECT_EQ(runWell({"cat", inside("/docs/a%20b.txt"), other}), "text of aother");
+}
+
+TEST_F(Archive, WithNamesThatMeanHarmIsCopiedBeneathTheTargetOnly)
+{
+    makeFolder("work");
+    makeFolder("work/deep");
+    pack({"/usr/bin/env", "python3", "-c",
+          "import zipfile\n"
+          "with zipfile.ZipFile('../evil.zip', 'w') as z:\n"
+          "    for name in ['../../up', '/etc/absolute', '..\\\\..\\\\back', 'C:\\\\drive', 'C:/d', 'e\\033[31m', "
+          "'n\\nl']:\n"
+          "        z.writestr(name, 'content')\n"},
+         "tree");
+    runWell({"cp", "-r", "zip:file://" + (folder / "evil.zip").string() + "!/", "work/deep/out"});
+    for (auto const* const name :
+         {"%2E%2E/%2E%2E/up", "etc/absolute", "..\\..\\back", "C:\\drive", "C:/d", "e\033[31m", "n\nl"})
+        EXPECT_EQ(folder.read(std::string("work/deep/out/") + name), "content") << name;
+    EXPECT_EQ(runWell({"ls", "work"}), "deep\n");
+    EXPECT_EQ(runWell({"ls", "work/deep"}), "out\n");
 }
 
 TEST_F(Archive, ThatIsNoneIsToldFromAMissingOne)

@@ -4,6 +4,7 @@
 
 #include <storage/local/DurabilityException.hpp>
 #include <storage/provider/ReasonInfo.hpp>
+#include <tests/support/TestStreamFailure.hpp>
 
 namespace foundation::storage::tool {
 namespace {
@@ -24,6 +25,14 @@ TEST(Explain, PrefersWhatTheFailureSays)
     error << provider::ReasonInfo(u"the \u00fcbermittlung ended");
     EXPECT_EQ(explain(error), "the \xC3\xBC"
                               "bermittlung ended");
+}
+
+TEST(Explain, GivesTheWordsOfAFailureOfAStreamToo)
+{
+    tests::support::TestStreamFailure failure(ErrorCode::IOError);
+    EXPECT_EQ(explain(failure), "reading or writing failed");
+    failure << provider::ReasonInfo(u"damaged");
+    EXPECT_EQ(explain(failure), "damaged");
 }
 
 TEST(Explain, TellsThatAChangeTookPlaceThoughItMayNotLast)

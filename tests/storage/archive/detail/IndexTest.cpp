@@ -216,6 +216,14 @@ TEST(Index, HardLinksWithoutAFileStayHardLinks)
         EXPECT_EQ(index.at(*index.find(path, LastLink::Follow).id).kind, EntryKind::HardLink);
 }
 
+TEST(Index, WhatLiesTooDeepIsInTheRoot)
+{
+    ArchiveLimits const limits{.depth = 3};
+    Index const index = indexOf({file(u"/a/b/./d", 1), file(u"a//b/c", 2), hardLink(u"h", u"a/b/./d")}, limits);
+    EXPECT_THAT(pathsOf(index), ElementsAre(u"a%2Fb%2F.%2Fd", u"a/", u"a/b/", u"a/b/c", u"h"));
+    EXPECT_EQ(locatorOf(index, u"h"), 1u);
+}
+
 TEST(Index, RefusesMoreEntriesThanAllowedWhoeverNamesThem)
 {
     ArchiveLimits const limits{.entries = 3};

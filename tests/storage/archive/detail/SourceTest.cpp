@@ -3,6 +3,7 @@
 #include <storage/archive/detail/BufferedReader.hpp>
 #include <storage/archive/detail/Fault.hpp>
 #include <storage/archive/detail/Spool.hpp>
+#include <tests/storage/archive/ObservedStore.hpp>
 #include <tests/storage/archive/containers.hpp>
 
 #include <gtest/gtest.h>
@@ -12,6 +13,7 @@
 namespace foundation::storage::archive::detail {
 namespace {
 
+using namespace provider;
 using Reason = ArchiveException::Reason;
 
 std::string numbers(std::size_t size)
@@ -55,6 +57,51 @@ TEST(Source, ReadsAFileAtAnyPlace)
 {
     std::string const content = numbers(100'000);
     expectServes(*openSource(makeFile(content), {}), content);
+}
+
+/// A store whose streams answer that they have no place to go to.
+class StoreWithoutPlaces final : public memory::MemoryProvider
+{
+public:
+    using MemoryProvider::MemoryProvider;
+
+protected:
+    std::unique_ptr<ByteStream> doOpenReadOnlyStream(StorageIRI const& iri) const override
+    {
+        return std::make_unique<Stream>(MemoryProvider::doOpenReadOnlyStream(iri));
+    }
+
+private:
+    class Stream final : public ByteStream
+    {
+    public:
+        explicit Stream(std::unique_ptr<ByteStream> stream) : stream_(std::move(stream)) {}
+
+    protected:
+        long doRead(char* buffer, long count) override { return stream_->read(buffer, count); }
+        long doWrite(char const* data, long count) override { return stream_->write(data, count); }
+        long doSeek(long /*offset*/, std::ios_base::seekdir /*direction*/) override { return -1; }
+        void doClose() override { stream_->close(); }
+
+    private:
+        std::unique_ptr<ByteStream> stream_;
+    };
+};
+
+TEST(Source, CopiesAFileWhoseStreamsCannotBeMovedHoweverTheySayIt)
+{
+    std::string const content = numbers(100'000);
+    StorageIRI const root(u"mem://archives/");
+    std::vector<std::shared_ptr<IProvider>> const stores{
+        std::make_shared<StoreWithoutPlaces>(root),
+        std::make_shared<ObservedStore>(root, ObservedStore::Seeking::Impossible)};
+    for (auto const& store : stores) {
+        StorageItem const file(store, StorageIRI(root, u"file"));
+        write(file, content);
+        auto const source = openSource(file, {});
+        EXPECT_NE(dynamic_cast<Spool const*>(source.get()), nullptr);
+        expectServes(*source, content);
+    }
 }
 
 TEST(Spool, KeepsWhatFitsInMemory)
