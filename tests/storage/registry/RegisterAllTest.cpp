@@ -22,7 +22,8 @@ TEST(RegisterAll, AddsWhatIsBuiltIn)
         {u"mem", SchemeKind::Physical},   {u"sevenzip", SchemeKind::Container}, {u"tar", SchemeKind::Container},
         {u"zip", SchemeKind::Container},
 #else
-        {u"file", SchemeKind::Physical},  {u"mem", SchemeKind::Physical},
+        {u"file", SchemeKind::Physical},
+        {u"mem", SchemeKind::Physical},
 #endif
     };
     EXPECT_EQ(registry.schemes(), expected);
