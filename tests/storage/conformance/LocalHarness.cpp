@@ -7,6 +7,7 @@
 #include <boost/property_tree/ptree.hpp>
 #include <fcntl.h>
 #include <filesystem>
+#include <fstream>
 #include <set>
 #include <string>
 #include <sys/stat.h>
@@ -44,6 +45,16 @@ void makeRelativeLink(provider::StorageIRI const& link, provider::StorageIRI con
     std::filesystem::create_symlink(std::filesystem::path(native(target)).lexically_relative(path.parent_path()), path);
 }
 
+/// Not for root, unless it has given up what puts it above them.
+bool permissionsBind()
+{
+    tests::support::TemporaryFolder const folder;
+    std::filesystem::path const file = folder.path() / "nobody's";
+    std::ofstream(file) << "secret";
+    std::filesystem::permissions(file, std::filesystem::perms::none);
+    return ::access(file.c_str(), R_OK) != 0;
+}
+
 std::set<std::string> attributesOfEveryFile()
 {
     std::set<std::string> names{"mode",   "uid",       "gid",        "links",     "inode",
@@ -60,7 +71,6 @@ std::set<std::string> attributesOfEveryFile()
 
 Harness localHarness()
 {
-    bool const permissionsBind = ::geteuid() != 0;
     return {
         .makePlace = makePlace,
         .capabilities = {.recursiveRemoval = true,
@@ -70,7 +80,7 @@ Harness localHarness()
                          .patterns = Patterns::Globs,
                          .settableTimes = boost::posix_time::microseconds(1),
                          .settableWritability = true,
-                         .enforcedWritability = permissionsBind,
+                         .enforcedWritability = permissionsBind(),
                          .fileEvents = true,
                          .folderEvents = true,
                          .extendedAttributes = attributesOfEveryFile(),
