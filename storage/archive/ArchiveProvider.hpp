@@ -47,7 +47,9 @@ public:
     ///
     /// A file that is open for writing goes in as it is at that moment. Entries that have not changed are copied as
     /// they are compressed. Errors: `ArchiveException`; the archive is as it was then, the changes are kept, and this
-    /// may be tried again. `Reason::Changed` when somebody else changed the container since the first change.
+    /// may be tried again. Only where the store fails with its very last step the archive may be the new one already.
+    /// `Reason::Changed` when somebody else changed the container since the first change; that is not noticed of who
+    /// writes it at the same moment.
     void flush();
 
 protected:

@@ -68,6 +68,7 @@ public:
     Index::Id node = Node::none;
     unsigned writers = 0;
     std::optional<std::uint64_t> settledVersion;
+    bool isLost = false; ///< somebody else took the file out of the archive
 
 private:
     std::size_t readLocked(std::uint64_t offset, char* buffer, std::size_t count) const;

@@ -52,10 +52,10 @@ long DraftStream::doWrite(char const* data, long count)
     try {
         auto const offset = manner_.appends ? std::nullopt : std::optional(position_);
         position_ = draft_->write(offset, data, static_cast<std::size_t>(count));
+        watcher_.written();
     } catch (Fault const& fault) {
         throw ArchiveStreamFailure("write", iri_, fault);
     }
-    watcher_.written();
     return count;
 }
 

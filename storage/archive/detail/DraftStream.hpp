@@ -25,7 +25,7 @@ public:
     /// What the owner of the draft wants to know; neither may be empty.
     struct Watcher
     {
-        std::function<void()> written; ///< after each write
+        std::function<void()> written; ///< after each write; a failure is one of writing
         std::function<void()> closed;  ///< once; a failure is one of closing
     };
 

@@ -3,6 +3,8 @@
 #include <storage/archive/detail/Fault.hpp>
 #include <storage/archive/detail/IndexBuilder.hpp>
 
+#include <fl/filesystem/native_name.hpp>
+
 #include <algorithm>
 #include <utility>
 
@@ -20,6 +22,7 @@ PendingTree::PendingTree(std::shared_ptr<Archive const> base, ArchiveLimits cons
 {
     for (Id id = 0; id != index_.size(); ++id) {
         nodes_[id].origin = id;
+        text_ += index_.at(id).nameSize;
         Id const next = index_.at(id).nextSibling;
         if (next != Node::none)
             nodes_[next].previousSibling = id;
@@ -30,8 +33,14 @@ void PendingTree::requireRoom(std::u16string_view name) const
 {
     if (alive_ > limits_.entries)
         throw Fault(Reason::TooManyEntries);
-    std::size_t const text = index_.names_.size() + name.size();
-    std::size_t const bytes = (nodes_.size() + 1) * (sizeof(Node) + 2 * sizeof(Id)) + text * sizeof(char16_t);
+    if (nodes_.size() == Node::none)
+        throw Fault(Reason::IndexTooLarge);
+    requireSpace(alive_ + 1, text_ + name.size());
+}
+
+void PendingTree::requireSpace(std::size_t entries, std::size_t text) const
+{
+    std::size_t const bytes = entries * (sizeof(Node) + 2 * sizeof(Id)) + text * sizeof(char16_t);
     if (bytes > limits_.indexBytes || text > Node::none)
         throw Fault(Reason::IndexTooLarge);
 }
@@ -46,7 +55,7 @@ PendingTree::Id PendingTree::add(Id folder, std::u16string_view name, EntryKind 
     nodes_.emplace_back();
     index_.nodes_.push_back(node);
     ++alive_;
-    rename(id, name);
+    rename(id, std::u16string(name));
     link(id, folder);
     if (index_.nodes_.size() * 2 > index_.slots_.size())
         growSlots();
@@ -67,26 +76,61 @@ void PendingTree::remove(Id id)
     node.packed.reset();
     node.draft.reset();
     --alive_;
+    text_ -= std::exchange(index_.nodes_[id].nameSize, 0);
     isChanged_ = true;
 }
 
 void PendingTree::move(Id id, Id folder, std::u16string_view name)
 {
-    requireRoom(name);
+    std::size_t const oldSize = index_.at(id).nameSize;
+    if (name.size() > oldSize)
+        requireSpace(alive_, text_ - oldSize + name.size());
+    relocate(id, folder, std::u16string(name));
+}
+
+void PendingTree::replace(Id target, Id id)
+{
+    Id const folder = index_.at(target).parent;
+    std::u16string const name(index_.name(target));
+    remove(target);
+    relocate(id, folder, name);
+}
+
+void PendingTree::relocate(Id id, Id folder, std::u16string const& name)
+{
     freeSlot(id);
     unlink(id);
     if (index_.name(id) != name)
-        rename(id, std::u16string(name));
+        rename(id, name);
     link(id, folder);
     occupySlot(id);
     isChanged_ = true;
 }
 
-void PendingTree::rename(Id id, std::u16string_view name)
+void PendingTree::rename(Id id, std::u16string const& name)
 {
+    text_ -= std::exchange(index_.nodes_[id].nameSize, 0);
+    dropOldNames(name.size());
     index_.nodes_[id].nameBegin = static_cast<std::uint32_t>(index_.names_.size());
     index_.nodes_[id].nameSize = static_cast<std::uint32_t>(name.size());
     index_.names_ += name;
+    text_ += name.size();
+}
+
+/// Only when they are many, so that it costs little for each change.
+void PendingTree::dropOldNames(std::size_t needed)
+{
+    std::size_t const size = index_.names_.size() + needed;
+    if (size <= 2 * (text_ + needed) + nodes_.size() && size <= Node::none)
+        return;
+    std::u16string names;
+    names.reserve(text_ + needed);
+    for (Node& node : index_.nodes_) {
+        std::u16string_view const name = index_.nameOf(node);
+        node.nameBegin = static_cast<std::uint32_t>(names.size());
+        names += name;
+    }
+    index_.names_ = std::move(names);
 }
 
 void PendingTree::link(Id id, Id folder)
@@ -159,6 +203,13 @@ void PendingTree::setContent(Id file, PackedPtr packed)
     isChanged_ = true;
 }
 
+void PendingTree::takeDraft(Id file, PackedPtr packed)
+{
+    setContent(file, std::move(packed));
+    index_.nodes_[file].modified = nodes_[file].draft->modified();
+    nodes_[file].isDated = true;
+}
+
 void PendingTree::setOrigin(Id file, Id origin)
 {
     index_.nodes_[file].size = base_->index().at(origin).size;
@@ -182,6 +233,26 @@ bool PendingTree::isBelow(Id id, Id folder) const
     while (id != Index::root && id != folder)
         id = index_.at(id).parent;
     return id == folder;
+}
+
+std::size_t PendingTree::depth(Id id) const
+{
+    std::size_t depth = 0;
+    for (; id != Index::root; id = index_.at(id).parent)
+        ++depth;
+    return depth;
+}
+
+PendingTree::Extent PendingTree::extentBelow(Id id) const
+{
+    Extent extent;
+    for (Id child = index_.at(id).firstChild; child != Node::none; child = index_.at(child).nextSibling) {
+        Extent const below = extentBelow(child);
+        std::size_t const name = 1 + fl::filesystem::to_native_bytes(index_.name(child)).size();
+        extent.depth = std::max(extent.depth, 1 + below.depth);
+        extent.bytes = std::max(extent.bytes, name + below.bytes);
+    }
+    return extent;
 }
 
 std::u16string PendingTree::path(Id id) const

@@ -31,7 +31,8 @@ struct PendingNode
 
 /// The tree of an archive with changes that the archive does not have yet.
 ///
-/// Entries of the old archive keep their ids, and ids of removed ones are not given away again. Names are to be safe.
+/// Entries of the old archive keep their ids, and ids of removed ones are not given away again. What is removed counts
+/// no longer for the limits. Names are to be safe.
 /// Errors: `Fault` for what goes beyond the limits; nothing has changed then.
 /// Threads: its user guards it, but for `node` and `path` of entries that stay as they are.
 class FOUNDATION_API PendingTree
@@ -64,10 +65,19 @@ public:
 
     void move(Id id, Id folder, std::u16string_view name);
 
+    /// Moves an entry to where another one is, which goes. That needs no room.
+    void replace(Id target, Id id);
+
+    /// Throws `Fault` where an entry of that name could not be added.
+    void requireRoom(std::u16string_view name) const;
+
     void setModified(Id id, std::int64_t time);
 
     /// Gives a file content that replaces what it had.
     void setContent(Id file, PackedPtr packed);
+
+    /// Gives a file what its draft holds, packed, and the time of that. The draft stays.
+    void takeDraft(Id file, PackedPtr packed);
 
     /// Gives a file the content and the mode of an entry of the old archive.
     void setOrigin(Id file, Id origin);
@@ -81,12 +91,26 @@ public:
     /// From the root, without a separator in front.
     std::u16string path(Id id) const;
 
+    /// How many names there are from the root to an entry, its own included.
+    std::size_t depth(Id id) const;
+
+    /// How far it goes down below an entry.
+    struct Extent
+    {
+        std::size_t depth = 0; ///< names on the way to the deepest entry
+        std::size_t bytes = 0; ///< of the longest path in UTF-8, with a separator before each name
+    };
+
+    Extent extentBelow(Id id) const;
+
     /// The entries that are in a folder now.
     std::vector<Id> children(Id folder) const;
 
 private:
-    void requireRoom(std::u16string_view name) const;
-    void rename(Id id, std::u16string_view name);
+    void requireSpace(std::size_t entries, std::size_t text) const;
+    void relocate(Id id, Id folder, std::u16string const& name);
+    void rename(Id id, std::u16string const& name);
+    void dropOldNames(std::size_t needed);
     void link(Id id, Id folder);
     void unlink(Id id);
     void occupySlot(Id id);
@@ -98,6 +122,7 @@ private:
     Index index_;
     std::size_t const baseSize_;
     std::size_t alive_;
+    std::size_t text_ = 0; ///< UTF-16 units of the names of what is there
     std::vector<PendingNode> nodes_;
     bool isChanged_ = false;
 };

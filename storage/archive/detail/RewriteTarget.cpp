@@ -91,6 +91,7 @@ void RewriteTarget::commit()
     if (draft_ != nullptr)
         sendDraft();
     beforeCommit_();
+    isSent_ = true;
     inStore([&] { stream_->close(StreamClosePolicy::Commit); });
 }
 

@@ -35,6 +35,9 @@ public:
     /// May be tried once.
     void commit();
 
+    /// Whether the store was told to put the file in place. It may have done so even when it says that it failed.
+    bool isSent() const { return isSent_; }
+
 private:
     void flushBuffer();
     void writeToStream(char const* data, std::size_t count);
@@ -50,6 +53,7 @@ private:
     std::uint64_t streamPosition_ = 0;
     std::uint64_t position_ = 0;
     std::uint64_t size_ = 0;
+    bool isSent_ = false;
 };
 
 } // namespace foundation::storage::archive::detail

@@ -50,6 +50,15 @@ bool replaces(ReplacementPolicy policy)
     return policy == ReplacementPolicy::Overwrite || policy == ReplacementPolicy::Clobber;
 }
 
+/// What lies below a folder has to be possible at its new place, too.
+void requirePossibleBelow(PendingTree const& tree, Index::Id folder, std::u16string const& path, std::size_t depth,
+                          ArchiveLimits const& limits, StorageIRI const& iri)
+{
+    PendingTree::Extent const below = tree.extentBelow(folder);
+    if (depth + below.depth > limits.depth || bytesOf(path, iri) + below.bytes >= longestPath)
+        throw Exception(ErrorCode::InvalidLocation, iri);
+}
+
 /// In whole seconds, as a zip has them.
 std::int64_t wholeSeconds(std::int64_t microseconds)
 {
@@ -63,8 +72,10 @@ constexpr std::int64_t earliestTime = -11'644'473'600'000'000;
 } // namespace
 
 WritableArchive::Change::Change(WritableArchive& archive)
-    : archive_(archive), flushLock_(archive.waitForFlush()), lock_(*archive.treeMutex_)
+    : archive_(archive), flushLock_(archive.waitForFlush()), lock_(*archive.treeMutex_, std::defer_lock)
 {
+    archive_.continueAfterFlush();
+    lock_.lock();
     if (archive_.tree_ == nullptr)
         archive_.beginTree(lock_);
 }
@@ -163,12 +174,17 @@ Index::Id WritableArchive::addFile(PendingTree& tree, Place const& place, Storag
 
 void WritableArchive::removeEntry(PendingTree& tree, Index::Id id)
 {
+    detachBelow(tree, id);
+    tree.remove(id);
+}
+
+void WritableArchive::detachBelow(PendingTree& tree, Index::Id id)
+{
     auto const drafts = drafts_;
     for (Draft* const draft : drafts) {
         if (tree.isBelow(draft->node, id))
             detach(tree, *draft);
     }
-    tree.remove(id);
 }
 
 bool WritableArchive::createArchive(StorageIRI const& iri)
@@ -251,9 +267,12 @@ void WritableArchive::moveFile(StorageIRI const& from, StorageIRI const& to, Rep
     if (target.id == file)
         return;
     beforeChange(tree);
-    if (target.id)
-        removeEntry(tree, *target.id);
-    at(to, [&] { tree.move(file, target.folder, target.name); });
+    if (!target.id) {
+        at(to, [&] { tree.move(file, target.folder, target.name); });
+        return;
+    }
+    detachBelow(tree, *target.id);
+    tree.replace(*target.id, file);
 }
 
 void WritableArchive::moveFolder(StorageIRI const& from, StorageIRI const& to, ReplacementPolicy policy)
@@ -276,6 +295,8 @@ void WritableArchive::moveFolder(StorageIRI const& from, StorageIRI const& to, R
         throw Exception(ErrorCode::ResourceAlreadyExists, to);
     if (tree.isBelow(target.folder, folder))
         throw Exception(ErrorCode::InvalidLocation, to);
+    requirePossibleBelow(tree, folder, tree.path(target.folder) + u'/' + target.name, tree.depth(target.folder) + 1,
+                         limits(), to);
     beforeChange(tree);
     at(to, [&] { tree.move(folder, target.folder, target.name); });
 }

@@ -117,6 +117,7 @@ private:
     Place newPlace(PendingTree const& tree, provider::StorageIRI const& iri) const;
     Index::Id addFile(PendingTree& tree, Place const& place, provider::StorageIRI const& iri);
     void removeEntry(PendingTree& tree, Index::Id id);
+    void detachBelow(PendingTree& tree, Index::Id id);
 
     provider::IProvider::Listing listNow(provider::StorageIRI const& folder, Selection const& selection) const;
     Held held(provider::StorageIRI const& iri) const;
@@ -136,13 +137,17 @@ private:
 
     void packDrafts();
     void rewrite();
+    bool isContainerOfSize(std::uint64_t size) const;
     void requireUnchangedContainer() const;
     void continueAfterFlush();
+    void tryToContinue();
+    void carryOver(Draft& draft, PendingTree& from, PendingTree& to);
 
     std::shared_ptr<std::mutex> const treeMutex_ = std::make_shared<std::mutex>();
     mutable std::mutex gate_;
     mutable std::shared_mutex flushMutex_; ///< exclusively held by a flush; comes before the other
     std::shared_ptr<PendingTree> tree_;
+    bool isWritten_ = false;         ///< `tree_` is what the archive holds, which has not been opened again yet
     std::optional<Stamp> baseStamp_; ///< of the container that `tree_` began with; nothing when there was none
     std::set<Draft*> drafts_;        ///< those of files in `tree_`
     std::shared_ptr<PackStore> const store_ = std::make_shared<PackStore>(limits().spoolMemory);

@@ -151,9 +151,11 @@ bool WritableArchive::put(StorageIRI const& to, ReplacementPolicy policy, Held c
         throw Exception(ErrorCode::ResourceAlreadyExists, to);
     beforeChange(tree);
     bool const isFile = target.id && tree.index().at(*target.id).kind == EntryKind::File;
+    if (!isFile)
+        at(to, [&] { tree.requireRoom(target.name); });
     if (target.id && !isFile)
         removeEntry(tree, *target.id);
-    Index::Id const file = isFile ? *target.id : addFile(tree, target, to);
+    Index::Id const file = isFile ? *target.id : tree.add(target.folder, target.name, EntryKind::File);
     if (tree.node(file).draft != nullptr)
         detach(tree, *tree.node(file).draft);
     if (content.packed != nullptr)
@@ -185,11 +187,11 @@ std::shared_ptr<Draft> WritableArchive::joinDraft(StorageIRI const& iri, ByteStr
             PendingTree& tree = change.tree();
             Place const target = newPlace(tree, iri);
             bool const isNew = !target.id && options.create == ByteStreamCreate::Create;
-            if (isNew)
+            if (!isNew && tree.index().at(requireFile(viewOf(tree), iri)).kind != EntryKind::File)
+                throw Exception(ErrorCode::UnsupportedOperation, iri);
+            if (isNew || truncates)
                 beforeChange(tree);
             Index::Id const file = isNew ? addFile(tree, target, iri) : requireFile(viewOf(tree), iri);
-            if (tree.index().at(file).kind != EntryKind::File)
-                throw Exception(ErrorCode::UnsupportedOperation, iri);
             std::shared_ptr<Draft> draft = tree.node(file).draft;
             if (draft != nullptr || truncates || isNew) {
                 if (draft == nullptr) {
@@ -198,7 +200,6 @@ std::shared_ptr<Draft> WritableArchive::joinDraft(StorageIRI const& iri, ByteStr
                     draft->settledVersion = isNew ? std::optional(draft->version()) : std::nullopt;
                 }
                 if (truncates && !isNew) {
-                    beforeChange(tree);
                     draft->truncate();
                     tree.markChanged();
                 }
@@ -253,6 +254,8 @@ void WritableArchive::detach(PendingTree& tree, Draft& draft)
 void WritableArchive::noteWrite(Draft const& draft)
 {
     std::lock_guard const lock(*treeMutex_);
+    if (draft.isLost)
+        throw Fault(ArchiveException::Reason::Changed);
     if (draft.node != Node::none)
         tree_->markChanged();
 }
@@ -262,7 +265,10 @@ void WritableArchive::leave(Draft& draft)
 {
     {
         std::lock_guard const lock(*treeMutex_);
-        if (--draft.writers > 0 || draft.node == Node::none)
+        --draft.writers;
+        if (draft.isLost)
+            throw Fault(ArchiveException::Reason::Changed);
+        if (draft.writers > 0 || draft.node == Node::none)
             return;
         if (draft.settledVersion == draft.version()) {
             detach(*tree_, draft);
@@ -275,15 +281,15 @@ void WritableArchive::leave(Draft& draft)
     settle(draft, std::move(packed), version);
 }
 
-/// Others may have begun to write meanwhile; then the last of them packs.
+/// Others may have begun to write meanwhile; then the last of them packs. Where the archive has to be opened again
+/// first, the next change or flush does both.
 void WritableArchive::settle(Draft& draft, PackedPtr packed, std::uint64_t version)
 {
     auto const flushLock = waitForFlush();
     std::lock_guard const lock(*treeMutex_);
-    if (draft.node == Node::none || draft.writers > 0 || draft.version() != version)
+    if (isWritten_ || draft.node == Node::none || draft.writers > 0 || draft.version() != version)
         return;
-    tree_->setContent(draft.node, std::move(packed));
-    tree_->setModified(draft.node, draft.modified());
+    tree_->takeDraft(draft.node, std::move(packed));
     detach(*tree_, draft);
 }
 

@@ -18,6 +18,7 @@ void WritableArchive::flush()
 {
     std::lock_guard const gate(gate_);
     std::unique_lock const flushLock(flushMutex_);
+    continueAfterFlush();
     {
         std::lock_guard const lock(*treeMutex_);
         if (tree_ == nullptr || !tree_->isChanged())
@@ -27,10 +28,21 @@ void WritableArchive::flush()
         packDrafts();
         rewrite();
     } catch (Fault const& fault) {
+        tryToContinue();
         bool const isOfStore = fault.reason == Reason::StoreFailed;
         throw ArchiveException(isOfStore ? Reason::NotWritten : fault.reason, fault.code, location());
     }
-    continueAfterFlush();
+    tryToContinue();
+}
+
+/// What was written stays written; who makes the next change is told.
+void WritableArchive::tryToContinue()
+{
+    try {
+        continueAfterFlush();
+    } catch (provider::Exception const&) {
+        // tried again by then
+    }
 }
 
 /// Whoever writes a file goes on with it, and what he writes from now on waits for the next time.
@@ -41,7 +53,7 @@ void WritableArchive::packDrafts()
         std::uint64_t version = 0;
         PackedPtr packed = pack(*draft, store_, limits(), Packing::Smallest, version);
         if (draft->settledVersion != version) {
-            tree_->setContent(draft->node, std::move(packed));
+            tree_->takeDraft(draft->node, std::move(packed));
             draft->settledVersion = version;
         }
     }
@@ -57,37 +69,71 @@ void WritableArchive::rewrite()
 {
     requireUnchangedContainer();
     RewriteTarget target(container(), [this] { requireUnchangedContainer(); });
-    ZipRewrite(*tree_, target).run();
+    try {
+        ZipRewrite(*tree_, target).run();
+        isWritten_ = true;
+    } catch (Fault const&) {
+        isWritten_ = target.isSent() && isContainerOfSize(target.size());
+        if (isWritten_)
+            release();
+        throw;
+    }
+    release();
 }
 
-/// The tree has done its work, but for files that are still being written.
+/// Whether it is a new one of that size.
+bool WritableArchive::isContainerOfSize(std::uint64_t size) const
+{
+    try {
+        auto const stamp = currentStamp();
+        return stamp && stamp != baseStamp_ && stamp->size == size;
+    } catch (provider::Exception const&) {
+        return false;
+    }
+}
+
+/// The tree has done its work once it is in the archive, but for files that are still being written. What fails here is
+/// tried again with the next change or flush.
 void WritableArchive::continueAfterFlush()
 {
-    release();
-    std::shared_ptr<PendingTree> const old = tree_; // goes unlocked
+    std::shared_ptr<PendingTree> old; // goes unlocked
     {
         std::lock_guard const lock(*treeMutex_);
+        if (!isWritten_)
+            return;
+        old = tree_;
         if (drafts_.empty()) {
             tree_.reset();
+            isWritten_ = false;
             return;
         }
     }
     Version const version = currentVersion();
     auto tree = std::make_shared<PendingTree>(version.archive, limits());
     std::lock_guard const lock(*treeMutex_);
-    for (Draft* const draft : std::set<Draft*>(drafts_)) {
-        auto const found = tree->index().find(old->path(draft->node), Index::LastLink::Keep).id;
-        if (!found) {
-            detach(*old, *draft);
-            continue;
-        }
-        tree->edit(*found).draft = old->node(draft->node).draft;
-        draft->node = *found;
-        if (draft->version() != draft->settledVersion)
-            tree->markChanged();
-    }
+    if (!isWritten_)
+        return;
+    for (Draft* const draft : std::set<Draft*>(drafts_))
+        carryOver(*draft, *old, *tree);
     tree_ = std::move(tree);
     baseStamp_ = version.stamp;
+    isWritten_ = false;
+}
+
+void WritableArchive::carryOver(Draft& draft, PendingTree& from, PendingTree& to)
+{
+    auto const found = to.index().find(from.path(draft.node), Index::LastLink::Keep).id;
+    bool const isFound = found && to.index().at(*found).kind == EntryKind::File;
+    bool const isSettled = draft.version() == draft.settledVersion;
+    if (!isFound || (isSettled && draft.writers == 0)) {
+        draft.isLost = !isFound;
+        detach(from, draft);
+        return;
+    }
+    to.edit(*found).draft = from.node(draft.node).draft;
+    draft.node = *found;
+    if (!isSettled)
+        to.markChanged();
 }
 
 } // namespace foundation::storage::archive::detail

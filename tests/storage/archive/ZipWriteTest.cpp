@@ -2,6 +2,7 @@
 
 #include <storage/archive/ArchiveException.hpp>
 #include <storage/memory/MemoryProvider.hpp>
+#include <storage/provider/ByteStreamFailure.hpp>
 #include <storage/provider/Exception.hpp>
 #include <storage/provider/StreamClosePolicy.hpp>
 #include <tests/storage/archive/containers.hpp>
@@ -367,6 +368,177 @@ TEST(ZipWrite, ThatFailsKeepsTheArchiveAndTheChangesAndCanBeTriedAgain)
         EXPECT_EQ(read(OpenZip(armed.container).item(u"new")), content);
     }
     EXPECT_GT(failures, 4u);
+}
+
+TEST(ZipWrite, ThatFailsLosesNothingOfAFileThatIsBeingWritten)
+{
+    std::size_t turns = 0;
+    for (bool isArmed = false; !isArmed; ++turns) {
+        SCOPED_TRACE(turns);
+        ArmedZip const armed;
+        auto const stream = armed.zip.item(u"new").openStream({});
+        stream->write("one", 3);
+        armed.arming->arm(turns + 1);
+        try {
+            armed.zip.provider->flush();
+            EXPECT_EQ(read(OpenZip(armed.container).item(u"new")), "one");
+        } catch (ArchiveException const&) {
+            EXPECT_EQ(read(armed.container), oldZip);
+        }
+        isArmed = armed.arming->isArmed();
+        armed.arming->disarm();
+        stream->write("two", 3);
+        stream->close();
+        armed.zip.provider->flush();
+        EXPECT_EQ(read(OpenZip(armed.container).item(u"new")), "onetwo");
+    }
+    EXPECT_GT(turns, 4u);
+}
+
+TEST(ZipWrite, GoesOnAfterAFailureOnceTheArchiveWasInPlace)
+{
+    ArmedZip const armed;
+    auto const stream = armed.zip.item(u"new").openStream({});
+    stream->write("one", 3);
+    armed.arming->failAfterCommit();
+    EXPECT_THROW(armed.zip.provider->flush(), ArchiveException);
+    stream->write("two", 3);
+    stream->close();
+    write(armed.zip.item(u"more"), "more");
+    armed.zip.provider->flush();
+    EXPECT_EQ(read(OpenZip(armed.container).item(u"new")), "onetwo");
+    EXPECT_EQ(read(OpenZip(armed.container).item(u"more")), "more");
+}
+
+/// That can happen where the archive is in place, and cannot be opened again at once.
+TEST(ZipWrite, FailsTheStreamOfAFileThatSomebodyElseTookOutAfterAFlush)
+{
+    std::size_t lost = 0;
+    bool isArmed = false;
+    for (std::size_t failing = 1; !isArmed; ++failing) {
+        ArmedZip const armed;
+        auto const stream = armed.zip.item(u"new").openStream({});
+        stream->write("one", 3);
+        armed.arming->arm(failing);
+        try {
+            armed.zip.provider->flush();
+        } catch (ArchiveException const&) {
+            continue;
+        }
+        isArmed = armed.arming->isArmed();
+        armed.arming->disarm();
+        write(armed.container, oldZip);
+        armed.zip.item(u"other").createFile();
+        try {
+            stream->write("two", 3);
+        } catch (ByteStreamFailure const&) {
+            ++lost;
+            EXPECT_THROW(stream->close(), ByteStreamFailure);
+        }
+    }
+    EXPECT_GT(lost, 0u);
+}
+
+TEST(ZipWrite, RefusesToTruncateWhatItCannotWriteAndLeavesItAsItWas)
+{
+    bool isRefused = true;
+    for (std::size_t failing = 1; isRefused; ++failing) {
+        SCOPED_TRACE(failing);
+        ArmedZip const armed;
+        StorageItem const file = armed.zip.item(u"old");
+        read(file);
+        armed.arming->arm(failing);
+        isRefused = false;
+        try {
+            file.openStream({.truncate = ByteStreamTruncate::TruncateExisting});
+        } catch (Exception const&) {
+            isRefused = true;
+        }
+        armed.arming->disarm();
+        if (!isRefused) {
+            EXPECT_GT(failing, 2u);
+            break;
+        }
+        EXPECT_EQ(read(file), "old content");
+        write(armed.zip.item(u"other"), "other");
+        armed.zip.provider->flush();
+        EXPECT_EQ(read(OpenZip(armed.container).item(u"old")), "old content");
+    }
+}
+
+TEST(ZipWrite, GivesAFileThatIsBeingWrittenTheTimeOfItsLastWrite)
+{
+    boost::posix_time::ptime const past(boost::gregorian::date(2001, 1, 1));
+    auto const timeIn = [](OpenZip const& zip) { return zip.item(u"old").getFileAttributes().getLastModified(); };
+    OpenZip const zip(makeFile(oldZip));
+    zip.item(u"old").setLastModified(past);
+    zip.provider->flush();
+    auto const stream = zip.item(u"old").openStream({});
+    stream->write("new", 3);
+    auto const written = timeIn(zip);
+    EXPECT_GT(written, past);
+    zip.provider->flush();
+    EXPECT_EQ(timeIn(OpenZip(zip.container)), written);
+    stream->close();
+    EXPECT_EQ(timeIn(zip), written);
+}
+
+TEST(ZipWrite, ReplacesAFileThoughNoMoreEntriesAreTaken)
+{
+    OpenZip const zip(makeFile(makeZip({{.name = "a", .content = "of a"}, {.name = "b", .content = "of b"}})),
+                      {.entries = 2});
+    zip.item(u"a").moveFile(zip.item(u"b").getLocation(), ReplacementPolicy::Overwrite);
+    EXPECT_THAT(pathsBelow(zip.root()), ElementsAre(u"b"));
+    EXPECT_EQ(read(zip.item(u"b")), "of a");
+    zip.provider->flush();
+    EXPECT_EQ(read(OpenZip(zip.container).item(u"b")), "of a");
+}
+
+TEST(ZipWrite, KeepsALinkThatACopyCannotReplace)
+{
+    OpenZip const zip(makeFile(makeZip({{.name = "a", .content = "of a"},
+                                        {.name = "b", .content = "of b"},
+                                        {.name = "link", .content = "a", .unixMode = 0120777}})),
+                      {.entries = 3});
+    EXPECT_THROW(zip.provider->copyFile(zip.item(u"b").getLocation(), zip.item(u"link").getLocation(),
+                                        ReplacementPolicy::Overwrite),
+                 ArchiveException);
+    EXPECT_EQ(read(zip.item(u"link")), "of a");
+}
+
+TEST(ZipWrite, CountsNothingThatWasRemoved)
+{
+    OpenZip const zip(makeFile(oldZip), {.indexBytes = 3000});
+    for (int turn = 0; turn != 1000; ++turn) {
+        zip.item(u"new").createFile();
+        zip.item(u"new").removeFile();
+    }
+    EXPECT_THAT(pathsBelow(zip.root()), UnorderedElementsAre(u"old", u"folder/", u"folder/in"));
+}
+
+TEST(ZipWrite, RefusesToMoveAFolderToWhereItWouldBeTooDeep)
+{
+    OpenZip const zip(makeFile(makeZip({{.name = "a/b/c", .content = "c"}, {.name = "d/e/f", .content = "f"}})),
+                      {.depth = 4});
+    StorageIRI const tooDeep = zip.item(u"d/e/a").getLocation();
+    EXPECT_EQ(failureOf([&] { zip.item(u"a").moveFolder(tooDeep, ReplacementPolicy::Preserve); }),
+              failure(ErrorCode::InvalidLocation, tooDeep));
+    zip.item(u"a").moveFolder(zip.item(u"d/a").getLocation(), ReplacementPolicy::Preserve);
+    zip.provider->flush();
+    EXPECT_EQ(read(OpenZip(zip.container, {.depth = 4}).item(u"d/a/b/c")), "c");
+}
+
+TEST(ZipWrite, RefusesToMoveAFolderToWhereItsPathsWouldBeTooLong)
+{
+    OpenZip const zip(makeFile(oldZip));
+    std::u16string const name(40'000, u'n');
+    zip.item(name).createFolder();
+    zip.item(u"other").createFolder();
+    zip.item(u"other/" + name).createFile();
+    StorageIRI const tooLong = zip.item(name + u"/other").getLocation();
+    EXPECT_EQ(failureOf([&] { zip.item(u"other").moveFolder(tooLong, ReplacementPolicy::Preserve); }),
+              failure(ErrorCode::InvalidLocation, tooLong));
+    zip.provider->flush();
 }
 
 TEST(ZipWrite, WritesThroughStreamsThatDoNotSeek)

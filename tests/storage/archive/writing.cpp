@@ -118,6 +118,8 @@ protected:
     {
         failIfDue();
         stream_->close(policy);
+        if (policy == StreamClosePolicy::Commit && owner_->failsAfterCommit_.exchange(false))
+            throw NoSpace();
     }
 
     ByteStream* doByteStream() override { return stream_->byteStream(); }

@@ -70,6 +70,9 @@ public:
     /// Whether the operation that is to fail has not come yet.
     bool isArmed() const { return left_ > 0; }
 
+    /// Has the next transactional stream fail once it has put its file in place.
+    void failAfterCommit() { failsAfterCommit_ = true; }
+
     /// Has transactional streams refuse to seek.
     void refuseToSeek() { seeks_ = false; }
 
@@ -87,6 +90,7 @@ private:
     provider::StorageIRI const file_;
     mutable std::atomic<long> left_ = 0;
     std::atomic<bool> seeks_ = true;
+    mutable std::atomic<bool> failsAfterCommit_ = false;
 };
 
 } // namespace foundation::storage::archive
