@@ -8,13 +8,6 @@ namespace foundation::storage::archive::detail {
 
 using Reason = ArchiveException::Reason;
 
-namespace {
-
-/// What a stream can seek to.
-constexpr std::uint64_t largestSize = std::uint64_t{1} << 62;
-
-} // namespace
-
 std::int64_t currentTime()
 {
     return static_cast<std::int64_t>(std::time(nullptr)) * 1'000'000;
@@ -24,7 +17,7 @@ std::uint64_t Draft::write(std::optional<std::uint64_t> offset, char const* data
 {
     std::lock_guard const lock(mutex_);
     std::uint64_t const begin = offset.value_or(size_);
-    if (begin > largestSize || count > largestSize - begin)
+    if (begin > mostBytes_ || count > mostBytes_ - begin)
         throw Fault(Reason::EntryTooLarge);
     store(begin, data, count);
     size_ = std::max(size_, begin + count);

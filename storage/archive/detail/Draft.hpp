@@ -4,6 +4,7 @@
 #include <storage/archive/detail/Index.hpp>
 #include <storage/archive/detail/TemporaryFile.hpp>
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <memory>
@@ -25,7 +26,8 @@ class FOUNDATION_API Draft
 public:
     static constexpr std::size_t mostMemory = std::size_t{1} << 20;
 
-    Draft() = default;
+    /// `mostBytes`: a write that would make it larger is `EntryTooLarge`.
+    explicit Draft(std::uint64_t mostBytes = largestSize) : mostBytes_(std::min(mostBytes, largestSize)) {}
     Draft(Draft const&) = delete;
     Draft& operator=(Draft const&) = delete;
 
@@ -74,6 +76,10 @@ private:
     std::size_t readLocked(std::uint64_t offset, char* buffer, std::size_t count) const;
     void store(std::uint64_t offset, char const* data, std::size_t count);
 
+    /// What a stream can seek to.
+    static constexpr std::uint64_t largestSize = std::uint64_t{1} << 62;
+
+    std::uint64_t const mostBytes_;
     mutable std::mutex mutex_;
     std::vector<char> memory_;
     std::unique_ptr<TemporaryFile> file_;

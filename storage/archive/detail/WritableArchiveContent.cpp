@@ -195,7 +195,7 @@ std::shared_ptr<Draft> WritableArchive::joinDraft(StorageIRI const& iri, ByteStr
             std::shared_ptr<Draft> draft = tree.node(file).draft;
             if (draft != nullptr || truncates || isNew) {
                 if (draft == nullptr) {
-                    draft = std::make_shared<Draft>();
+                    draft = std::make_shared<Draft>(limits().entryBytes);
                     attach(tree, file, draft);
                     draft->settledVersion = isNew ? std::optional(draft->version()) : std::nullopt;
                 }
@@ -208,7 +208,7 @@ std::shared_ptr<Draft> WritableArchive::joinDraft(StorageIRI const& iri, ByteStr
             }
         }
         Held const content = held(iri);
-        auto const draft = std::make_shared<Draft>();
+        auto const draft = std::make_shared<Draft>(limits().entryBytes);
         at(iri, [&] { copyInto(*draft, *openHeld(content), content.size); });
         if (joinWith(iri, draft, content))
             return draft;
@@ -304,7 +304,7 @@ std::unique_ptr<TransactionalStream> WritableArchive::openTransaction(StorageIRI
         newPlace(change.tree(), iri);
         beforeChange(change.tree());
     }
-    auto const draft = std::make_shared<Draft>();
+    auto const draft = std::make_shared<Draft>(limits().entryBytes);
     DraftStream::Manner const manner{options.access == ByteStreamAccess::ReadWrite,
                                      options.append == ByteStreamAppend::Append};
     return std::make_unique<DraftTransaction>(iri, draft, manner,

@@ -55,7 +55,7 @@ FileAttributes WritableArchive::fileAttributes(StorageIRI const& iri) const
     View const view = this->view();
     Index::Id const id = requireFile(view, iri);
     if (!view.lock.owns_lock())
-        return detail::fileAttributes(view.index->at(id), true);
+        return detail::fileAttributes(view.index->at(id), view.archive->isWritable());
     return FileAttributes(tree_->size(id), toPtime(tree_->modified(id)), true);
 }
 

@@ -94,10 +94,18 @@ Index readIndex(ZipHandle& handle, ArchiveLimits const& limits, std::int64_t mod
     return builder.finish();
 }
 
+/// As the first entry does, or the end of a directory without entries.
+bool beginsAsZip(Source const& source)
+{
+    std::string begin(4, '\0');
+    begin.resize(source.readAt(0, begin.data(), begin.size()));
+    return begin == "PK\x03\x04" || begin == "PK\x05\x06";
+}
+
 } // namespace
 
 ZipArchive::ZipArchive(std::shared_ptr<Source const> source, ArchiveLimits const& limits, std::int64_t modified)
-    : source_(std::move(source)), limits_(limits)
+    : source_(std::move(source)), limits_(limits), beginsAsZip_(beginsAsZip(*source_))
 {
     auto handle = std::make_unique<ZipHandle>(source_, limits_);
     index_ = readIndex(*handle, limits_, modified);

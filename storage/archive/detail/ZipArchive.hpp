@@ -24,7 +24,9 @@ public:
 
     std::unique_ptr<Content> open(Index::Id file) const override;
     bool isRandomAccess(Index::Id file) const override;
-    bool isWritable() const override { return true; }
+
+    /// Not with a program in front, which would be lost.
+    bool isWritable() const override { return beginsAsZip_; }
 
     std::shared_ptr<Source const> const& source() const { return source_; }
 
@@ -74,6 +76,7 @@ private:
 
     std::shared_ptr<Source const> const source_;
     ArchiveLimits const limits_;
+    bool const beginsAsZip_;
     std::uint64_t size_ = 0; ///< entries in the directory
     mutable std::mutex mutex_;
     mutable std::vector<Slot> slots_;

@@ -72,8 +72,23 @@ void ZipRewrite::run()
 
 void ZipRewrite::writeEmpty()
 {
-    target_.write(emptyZip, sizeof emptyZip);
+    std::string const comment = commentOfOld();
+    std::string end(emptyZip, sizeof emptyZip);
+    end[end.size() - 2] = static_cast<char>(comment.size() & 0xFF);
+    end[end.size() - 1] = static_cast<char>(comment.size() >> 8);
+    end += comment;
+    target_.write(end.data(), end.size());
     target_.commit();
+}
+
+std::string ZipRewrite::commentOfOld()
+{
+    if (old_ == nullptr)
+        return {};
+    open();
+    int size = 0;
+    char const* const comment = zip_get_archive_comment(zip_, &size, ZIP_FL_ENC_RAW);
+    return comment == nullptr ? std::string() : std::string(comment, static_cast<std::size_t>(size));
 }
 
 void ZipRewrite::open()
@@ -207,8 +222,13 @@ void ZipRewrite::addFolder(Id id)
 {
     zip_int64_t const added = zip_dir_add(zip_, nameOf(id).c_str(), ZIP_FL_ENC_GUESS);
     require(added >= 0);
-    setMode(static_cast<Number>(added), modeOfFolders);
-    setTime(static_cast<Number>(added), tree_.index().at(id).modified);
+    Number const number = static_cast<Number>(added);
+    Node const& node = tree_.index().at(id);
+    if (node.locator == Node::noLocator)
+        setMode(number, modeOfFolders);
+    else
+        copyMode(ZipArchive::numberOf(node), number);
+    setTime(number, node.modified);
 }
 
 void ZipRewrite::addFile(Id id)

@@ -48,6 +48,7 @@ private:
     void open();
     void close();
     void writeEmpty();
+    std::string commentOfOld();
     void findOwners();
     void removeEntries();
     void removeEntry(Number number);

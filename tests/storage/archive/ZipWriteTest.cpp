@@ -6,6 +6,7 @@
 #include <storage/provider/Exception.hpp>
 #include <storage/provider/StreamClosePolicy.hpp>
 #include <tests/storage/archive/containers.hpp>
+#include <tests/storage/archive/rawZips.hpp>
 #include <tests/storage/archive/writing.hpp>
 #include <tests/storage/archive/zips.hpp>
 #include <tests/support/failureOf.hpp>
@@ -150,6 +151,35 @@ TEST(ZipWrite, KeepsAFolderThatOnlyPathsNamedWhenItsLastFileGoes)
     zip.item(u"folder/in").removeFile();
     zip.provider->flush();
     EXPECT_THAT(pathsBelow(OpenZip(zip.container).root()), UnorderedElementsAre(u"old", u"folder/"));
+}
+
+TEST(ZipWrite, KeepsTheCommentWhenTheLastEntryGoes)
+{
+    OpenZip const zip(makeFile(bytesOf({.entries = {{.name = "a"}}, .comment = "what it says"})));
+    zip.item(u"a").removeFile();
+    zip.provider->flush();
+    EXPECT_EQ(read(zip.container), bytesOf({.entries = {}, .comment = "what it says"}));
+}
+
+TEST(ZipWrite, KeepsTheModeOfAFolderThatIsNamedLikeAFile)
+{
+    std::uint32_t const mode = 040700;
+    OpenZip const zip(makeFile(bytesOf({.entries = {{.name = "folder", .attributes = mode << 16}}})));
+    zip.item(u"new").createFile();
+    zip.provider->flush();
+    EXPECT_EQ(modeOf(read(zip.container), "folder/"), mode);
+}
+
+TEST(ZipWrite, RefusesToWriteAFileThatWouldBeTooLargeToRead)
+{
+    OpenZip const zip(makeFile(oldZip), {.entryBytes = 1000});
+    std::string const bytes(1001, 'x');
+    auto const stream = zip.item(u"new").openStream({});
+    EXPECT_THROW(stream->write(bytes.data(), 1001), ByteStreamFailure);
+    stream->write(bytes.data(), 1000);
+    stream->close();
+    zip.provider->flush();
+    EXPECT_EQ(OpenZip(zip.container).item(u"new").getFileAttributes().getSize(), 1000u);
 }
 
 TEST(ZipWrite, GivesEntriesTheNamesThatTheyAreShownUnder)
@@ -339,6 +369,21 @@ TEST(ZipWrite, InAReadOnlyStoreIsRefusedWithTheFirstChange)
               failure(ErrorCode::ReadOnlyProvider, container.getLocation()));
     EXPECT_FALSE(zip.item(u"new").fileExists());
     zip.provider->flush();
+}
+
+/// libzip would drop the program. The offsets in the zip count it, as they should.
+TEST(ZipWrite, OfAProgramWithAZipBehindItIsRefusedWithTheFirstChange)
+{
+    StorageItem const container =
+        makeFile(bytesOf({.entries = {{.name = "old", .content = "old content"}}, .prefix = "#!/bin/sh\n"}));
+    std::string const before = read(container);
+    OpenZip const zip(container);
+    EXPECT_EQ(read(zip.item(u"old")), "old content");
+    EXPECT_FALSE(zip.item(u"old").getFileAttributes().isWritable());
+    EXPECT_EQ(failureOf([&] { zip.item(u"new").createFile(); }),
+              failure(ErrorCode::UnsupportedOperation, container.getLocation()));
+    zip.provider->flush();
+    EXPECT_EQ(read(container), before);
 }
 
 /// The store of the archive fails with one operation after the other, until all have had their turn. That it cannot
