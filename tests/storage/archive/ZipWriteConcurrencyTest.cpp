@@ -11,7 +11,9 @@
 #include <gtest/gtest.h>
 
 #include <filesystem>
+#include <memory>
 #include <optional>
+#include <vector>
 
 namespace foundation::storage::archive {
 
@@ -88,6 +90,25 @@ TEST(ZipWriteConcurrency, StreamsThatAreOpenDuringFlushesLoseNothing)
             expected += contentOf(thread, round);
         EXPECT_EQ(read(again.item(nameOf(thread, 0))), expected);
     }
+}
+
+TEST(ZipWriteConcurrency, StreamsThatWereOpenedBeforeAFlushGoOnTogether)
+{
+    std::string const content(3'000'000, 'x');
+    OpenZip const zip(makeFile(makeZip({{.name = "old", .content = content, .isStored = true}})));
+    std::vector<std::unique_ptr<ByteStream>> streams;
+    for (int thread = 0; thread != threads; ++thread)
+        streams.push_back(zip.item(u"old").openReadOnlyStream());
+    write(zip.item(u"new"), "new");
+    zip.provider->flush();
+    inThreads(threads, [&](int thread) {
+        std::string bytes(content.size(), '\0');
+        long done = 0;
+        ByteStream& stream = *streams[static_cast<std::size_t>(thread)];
+        for (long read; (read = stream.read(bytes.data() + done, static_cast<long>(bytes.size()) - done)) > 0;)
+            done += read;
+        EXPECT_EQ(bytes, content);
+    });
 }
 
 TEST(ZipWriteConcurrency, TheLastUserGivesEveryDescriptorBack)
