@@ -4,6 +4,18 @@
 
 namespace foundation::storage::archive::detail {
 
+namespace {
+
+/// Of most file systems, which give only whole ones back.
+constexpr std::uint64_t block = 4096;
+
+std::uint64_t wholeBlocks(std::uint64_t size)
+{
+    return (size + block - 1) / block * block;
+}
+
+} // namespace
+
 PackStore::Piece PackStore::keep(char const* data, std::size_t count)
 {
     Piece piece;
@@ -32,7 +44,7 @@ TemporaryFile& PackStore::reserve(std::size_t count, std::uint64_t& offset)
     if (file_ == nullptr)
         file_ = std::make_unique<TemporaryFile>();
     offset = fileSize_;
-    fileSize_ += count;
+    fileSize_ += wholeBlocks(count);
     ++piecesInFile_;
     return *file_;
 }
@@ -57,7 +69,7 @@ void PackStore::drop(Piece const& piece) noexcept
     memoryLeft_ += piece.memory.size();
     if (!piece.memory.empty())
         return;
-    file_->forget(piece.offset, piece.size);
+    file_->forget(piece.offset, wholeBlocks(piece.size));
     if (--piecesInFile_ > 0)
         return;
     file_.reset();
