@@ -10,6 +10,7 @@
 #include <filesystem>
 #include <fstream>
 #include <map>
+#include <mutex>
 #include <random>
 #include <set>
 #include <string>
@@ -49,6 +50,7 @@ public:
     void follow(Kind kind, StorageIRI const& first, StorageIRI const& second, EntryType type,
                 boost::property_tree::ptree const& details)
     {
+        std::scoped_lock const lock(mutex_);
         bool const isFolder = type == EntryType::Folder;
         ++told;
         if (details.get("overflow", false))
@@ -61,7 +63,11 @@ public:
             names_.insert(slashed(relative(second), isFolder));
     }
 
-    Names const& names() const { return names_; }
+    Names names() const
+    {
+        std::scoped_lock const lock(mutex_);
+        return names_;
+    }
 
     int told = 0;
     int overflows = 0;
@@ -82,6 +88,7 @@ private:
     }
 
     fs::path base_;
+    mutable std::mutex mutex_; ///< the sanitizer does not see that an event comes after its change
     Names names_;
 };
 
